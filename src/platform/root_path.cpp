@@ -9,7 +9,7 @@ namespace {
 
 bool IsSafeShellChar(char c) {
     return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') ||
-           std::strchr("_./-+=:,@%", c) != nullptr;
+           (c != '\0' && std::strchr("_./-+=:,@%", c) != nullptr);
 }
 
 }  // namespace
