@@ -18,17 +18,18 @@ namespace {
 constexpr const char* kPidFile = "/var/run/vornnetd.pid";
 
 void Usage(FILE* out) {
-    std::fprintf(out,
-                 "Usage: vornnetd [--foreground] [--help] [--version]\n"
-                 "The network daemon of the Vorn appliance: runs the network modules (netlink\n"
-                 "monitor, gateway routes, LAN device list, IPv6 router advertisements) and serves\n"
-                 "their requests as \"com.tessarin.net\" at \"/\" on the session bus.\n"
-                 "\n"
-                 "  --foreground  stay attached and copy log lines to stderr\n"
-                 "  --help        show this text\n"
-                 "  --version     show the version\n"
-                 "\n"
-                 "Stops on SIGTERM or SIGINT. Paths and programs live under $VORN_ROOT when set.\n");
+    std::fprintf(
+        out,
+        "Usage: vornnetd [--foreground] [--help] [--version]\n"
+        "The network daemon of the Vorn appliance: runs the network modules (netlink\n"
+        "monitor, gateway routes, LAN device list, IPv6 router advertisements) and serves\n"
+        "their requests as \"com.tessarin.net\" at \"/\" on the session bus.\n"
+        "\n"
+        "  --foreground  stay attached and copy log lines to stderr\n"
+        "  --help        show this text\n"
+        "  --version     show the version\n"
+        "\n"
+        "Stops on SIGTERM or SIGINT. Paths and programs live under $VORN_ROOT when set.\n");
 }
 
 gboolean OnStopSignal(gpointer server) {

@@ -123,8 +123,8 @@ int DBusClient::SendMessage(bool waitReply, int timeoutMs) {
     }
     GVariant* params = g_variant_new_tuple(args_.data(), args_.size());
     if (!waitReply) {
-        GDBusMessage* message = g_dbus_message_new_method_call(
-            name_.c_str(), path_.c_str(), interface_.c_str(), method_.c_str());
+        GDBusMessage* message = g_dbus_message_new_method_call(name_.c_str(), path_.c_str(),
+                                                               interface_.c_str(), method_.c_str());
         g_dbus_message_set_body(message, params);
         g_dbus_message_set_flags(message, G_DBUS_MESSAGE_FLAGS_NO_REPLY_EXPECTED);
         GError* error = nullptr;
@@ -162,8 +162,7 @@ int DBusClient::GetReply(std::string& out) {
         return -1;
     }
     int result = -1;
-    if (g_variant_n_children(reply_) == 0 ||
-        !g_variant_is_of_type(reply_, G_VARIANT_TYPE_TUPLE)) {
+    if (g_variant_n_children(reply_) == 0 || !g_variant_is_of_type(reply_, G_VARIANT_TYPE_TUPLE)) {
         VORN_LOG(LOG_ERR, "Replied value is not a string");
     } else {
         GVariant* first = g_variant_get_child_value(reply_, 0);
@@ -185,7 +184,8 @@ int DBusClient::GetReply(std::vector<std::string>& out) {
         return -1;
     }
     int result = -1;
-    GVariant* first = g_variant_n_children(reply_) > 0 ? g_variant_get_child_value(reply_, 0) : nullptr;
+    GVariant* first =
+        g_variant_n_children(reply_) > 0 ? g_variant_get_child_value(reply_, 0) : nullptr;
     if (first == nullptr || !g_variant_is_of_type(first, G_VARIANT_TYPE_ARRAY)) {
         VORN_LOG(LOG_ERR, "Replied value is not an array ");
     } else {

@@ -15,7 +15,7 @@ namespace dbus {
 // failed call returns the negative of the first number in the error reply's message (-1 when it
 // holds none): services put numbers in their messages for callers to see.
 class DBusClient {
-public:
+  public:
     DBusClient(const char* name, const char* path, const char* interface, DBusBusType bus);
     virtual ~DBusClient();
     DBusClient(const DBusClient&) = delete;
@@ -37,10 +37,10 @@ public:
     // The error number of an error reply's own message text (any remote-error prefix removed).
     static int ErrorNumber(const char* message);
 
-protected:
+  protected:
     DBusBusType GetBusType() const { return bus_; }
 
-private:
+  private:
     void DropMessage();
     void DropReply();
 

@@ -14,7 +14,7 @@ namespace dbus {
 // the exported object, their string arguments, a place for their string result (g_malloc'ed, freed
 // after sending) and the error to set; they return TRUE on success.
 class DBusMethod {
-public:
+  public:
     using NoArgs = gboolean (*)(GObject*, GError**);
     using Out = gboolean (*)(GObject*, char**, GError**);
     using In = gboolean (*)(GObject*, const char*, GError**);
@@ -36,7 +36,7 @@ public:
         return invoke_(object, args, out, error);
     }
 
-private:
+  private:
     using Invoker =
         std::function<gboolean(GObject*, const std::vector<const char*>&, char**, GError**)>;
     DBusMethod(const char* name, int in, int out, Invoker invoke);

@@ -12,7 +12,9 @@ namespace {
 constexpr const char* kBusName = "org.freedesktop.DBus";
 constexpr const char* kBusPath = "/org/freedesktop/DBus";
 
-std::string OrEmpty(const gchar* text) { return text != nullptr ? text : ""; }
+std::string OrEmpty(const gchar* text) {
+    return text != nullptr ? text : "";
+}
 
 }  // namespace
 
@@ -146,8 +148,8 @@ void DBusServer::Dispatch(const gchar* methodName, GVariant* parameters,
         }
     }
     if (method == nullptr) {
-        g_dbus_method_invocation_return_dbus_error(invocation, "org.freedesktop.DBus.Error.UnknownMethod",
-                                                   "Unknown method");
+        g_dbus_method_invocation_return_dbus_error(
+            invocation, "org.freedesktop.DBus.Error.UnknownMethod", "Unknown method");
         return;
     }
     // The introspection data fixes the signature: every argument is a string.
@@ -174,15 +176,15 @@ void DBusServer::Dispatch(const gchar* methodName, GVariant* parameters,
     }
     if (ok) {
         g_dbus_method_invocation_return_value(
-            invocation, method->OutCount() == 1 ? g_variant_new("(s)", out != nullptr ? out : "")
-                                                : nullptr);
+            invocation,
+            method->OutCount() == 1 ? g_variant_new("(s)", out != nullptr ? out : "") : nullptr);
     } else if (error != nullptr) {
         g_dbus_method_invocation_return_gerror(invocation, error);
     } else {
         // What dbus-glib answered for a handler that failed without saying why.
-        g_dbus_method_invocation_return_error(invocation, G_DBUS_ERROR, G_DBUS_ERROR_FAILED,
-                                              "Method invoked for %s returned FALSE but did not set error",
-                                              methodName);
+        g_dbus_method_invocation_return_error(
+            invocation, G_DBUS_ERROR, G_DBUS_ERROR_FAILED,
+            "Method invoked for %s returned FALSE but did not set error", methodName);
     }
     g_clear_error(&error);
     g_free(out);
@@ -223,11 +225,11 @@ int DBusServer::NewSignal(const char* member) {
 
 int DBusServer::SendSignal() {
     GError* error = nullptr;
-    const bool sent = connection_ != nullptr && !signal_.empty() &&
-                      g_dbus_connection_emit_signal(connection_, nullptr, path_.c_str(),
-                                                    name_.c_str(), signal_.c_str(), nullptr,
-                                                    &error) &&
-                      g_dbus_connection_flush_sync(connection_, nullptr, &error);
+    const bool sent =
+        connection_ != nullptr && !signal_.empty() &&
+        g_dbus_connection_emit_signal(connection_, nullptr, path_.c_str(), name_.c_str(),
+                                      signal_.c_str(), nullptr, &error) &&
+        g_dbus_connection_flush_sync(connection_, nullptr, &error);
     signal_.clear();
     g_clear_error(&error);
     if (!sent) {

@@ -17,7 +17,7 @@ namespace dbus {
 // introspection XML, dispatches each call to its plain handler function and runs the main loop
 // that serves the calls, one at a time.
 class DBusServer {
-public:
+  public:
     DBusServer(const char* name, const char* path, DBusBusType bus);
     virtual ~DBusServer();
     DBusServer(const DBusServer&) = delete;
@@ -40,7 +40,7 @@ public:
     std::string GetBusName() const;
     std::string GetConnectionName() const;
 
-private:
+  private:
     static void OnMethodCall(GDBusConnection* connection, const gchar* sender,
                              const gchar* objectPath, const gchar* interfaceName,
                              const gchar* methodName, GVariant* parameters,

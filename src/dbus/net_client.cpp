@@ -10,7 +10,8 @@ namespace dbus {
 using vornwireless::utils::StyledJson;
 
 NetClient::NetClient()
-    : DBusClient("com.tessarin.net", "/", "com.tessarin.net", vornwireless::dbus::DBUS_BUS_SESSION) {}
+    : DBusClient("com.tessarin.net", "/", "com.tessarin.net",
+                 vornwireless::dbus::DBUS_BUS_SESSION) {}
 
 bool NetClient::IsServerReady() const {
     return vornwireless::utils::IsProcessAlive("vornnetd") && DBusClient::IsServerReady();

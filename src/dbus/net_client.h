@@ -13,7 +13,7 @@ namespace dbus {
 // Calls the network daemon's service. Each method is one blocking call: 0 on success, negative on
 // failure.
 class NetClient : public vornwireless::dbus::DBusClient {
-public:
+  public:
     NetClient();
     ~NetClient() override = default;
 
@@ -32,7 +32,7 @@ public:
     int RefreshGateway(Json::Value& info);
     int ResetIPv6Module(const std::string& ifname);
 
-private:
+  private:
     // One call with one string argument; the reply text goes to reply when it is not null.
     int Call(const char* method, const std::string& argument, std::string* reply);
     int CallForJson(const char* method, const std::string& argument, Json::Value& data,

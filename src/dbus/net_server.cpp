@@ -11,10 +11,10 @@
 
 namespace {
 
-using vornnetwork::network::module::MODULE_TYPE;
 using vornnetwork::network::module::MODULE_DEVICE_LIST;
 using vornnetwork::network::module::MODULE_IPV6;
 using vornnetwork::network::module::MODULE_ROUTE;
+using vornnetwork::network::module::MODULE_TYPE;
 using vornnetwork::network::module::ModuleManager;
 
 constexpr const char* kName = "com.tessarin.net";
@@ -92,20 +92,29 @@ gboolean ForwardText(const Route& route, GObject* object, const char* key, const
     return Forward(route, request, data, error);
 }
 
-const Route kGetDeviceList{"get", MODULE_DEVICE_LIST, "failed to get upnp data", "failed to get upnp data"};
-const Route kSetDeviceList{"set", MODULE_DEVICE_LIST, "failed to set device type", "failed to set device type"};
-const Route kDelDeviceList{"del", MODULE_DEVICE_LIST, "failed to delete data", "failed to set delete data"};
-const Route kGetGatewayList{"GET_GATEWAY_LIST_DATA", MODULE_ROUTE, "failed to get gateway list data",
-                            "failed to get gateway list data"};
-const Route kAddGateway{"ADD_GATEWAY_DATA", MODULE_ROUTE, "failed to add gateway data", "failed to add gateway data"};
-const Route kDelGateway{"DEL_GATEWAY_DATA", MODULE_ROUTE, "failed to del gateway data", "failed to del gateway data"};
+const Route kGetDeviceList{"get", MODULE_DEVICE_LIST, "failed to get upnp data",
+                           "failed to get upnp data"};
+const Route kSetDeviceList{"set", MODULE_DEVICE_LIST, "failed to set device type",
+                           "failed to set device type"};
+const Route kDelDeviceList{"del", MODULE_DEVICE_LIST, "failed to delete data",
+                           "failed to set delete data"};
+const Route kGetGatewayList{"GET_GATEWAY_LIST_DATA", MODULE_ROUTE,
+                            "failed to get gateway list data", "failed to get gateway list data"};
+const Route kAddGateway{"ADD_GATEWAY_DATA", MODULE_ROUTE, "failed to add gateway data",
+                        "failed to add gateway data"};
+const Route kDelGateway{"DEL_GATEWAY_DATA", MODULE_ROUTE, "failed to del gateway data",
+                        "failed to del gateway data"};
 const Route kGetGatewayByInterface{"GET_GATEWAY_DATA_BY_INTERFACE", MODULE_ROUTE,
                                    "failed to get gateway data by interface",
                                    "failed to get gateway data by interface"};
-const Route kSetSlave{"SET_SLAVE_DATA", MODULE_ROUTE, "failed to set slave data", "failed to set slave data"};
-const Route kCopyGateway{"COPY_GATEWAY_DATA", MODULE_ROUTE, "failed to copy gateway data", "failed to copy gateway data"};
-const Route kRefreshGateway{"REFRESH_GATEWAY", MODULE_ROUTE, "failed to refresh gateway", "failed to refresh gateway"};
-const Route kResetIPv6{"RESET_IPV6_MODULE", MODULE_IPV6, "failed to reset ipv6 module", "failed to reset ipv6 module"};
+const Route kSetSlave{"SET_SLAVE_DATA", MODULE_ROUTE, "failed to set slave data",
+                      "failed to set slave data"};
+const Route kCopyGateway{"COPY_GATEWAY_DATA", MODULE_ROUTE, "failed to copy gateway data",
+                         "failed to copy gateway data"};
+const Route kRefreshGateway{"REFRESH_GATEWAY", MODULE_ROUTE, "failed to refresh gateway",
+                            "failed to refresh gateway"};
+const Route kResetIPv6{"RESET_IPV6_MODULE", MODULE_IPV6, "failed to reset ipv6 module",
+                       "failed to reset ipv6 module"};
 
 }  // namespace
 
@@ -194,7 +203,9 @@ NetServer::NetServer()
                object_);
 }
 
-NetServer::~NetServer() { g_object_unref(object_); }
+NetServer::~NetServer() {
+    g_object_unref(object_);
+}
 
 }  // namespace dbus
 }  // namespace vornnetwork

@@ -11,13 +11,13 @@ namespace dbus {
 // The network daemon's service "com.tessarin.net" at "/" on the session bus: each method becomes
 // one JSON request to the module manager.
 class NetServer : public vornwireless::dbus::DBusServer {
-public:
+  public:
     NetServer();
     ~NetServer() override;
 
     static const char* const kIntrospection;
 
-private:
+  private:
     GObject* object_;
 };
 

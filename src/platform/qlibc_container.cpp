@@ -43,9 +43,13 @@ T* Allocate(int capacity, Items T::*items) {
 
 extern "C" {
 
-QLIBSZHASH* QLIBCSzHashAlloc(int capacity) { return Allocate(capacity, &QLIBSZHASH::entries); }
+QLIBSZHASH* QLIBCSzHashAlloc(int capacity) {
+    return Allocate(capacity, &QLIBSZHASH::entries);
+}
 
-void QLIBCSzHashFree(QLIBSZHASH* hash) { delete hash; }
+void QLIBCSzHashFree(QLIBSZHASH* hash) {
+    delete hash;
+}
 
 int QLIBCSzHashSetValue(QLIBSZHASH* hash, const char* key, const char* value) {
     if (hash == nullptr || key == nullptr || value == nullptr) {
@@ -117,9 +121,13 @@ const char* QLIBCSzHashValueAt(const QLIBSZHASH* hash, int index) {
     return hash->entries[static_cast<size_t>(index)].second.c_str();
 }
 
-QLIBSZLIST* QLIBCSzListAlloc(int capacity) { return Allocate(capacity, &QLIBSZLIST::items); }
+QLIBSZLIST* QLIBCSzListAlloc(int capacity) {
+    return Allocate(capacity, &QLIBSZLIST::items);
+}
 
-void QLIBCSzListFree(QLIBSZLIST* list) { delete list; }
+void QLIBCSzListFree(QLIBSZLIST* list) {
+    delete list;
+}
 
 int QLIBCSzListAdd(QLIBSZLIST* list, const char* value) {
     if (list == nullptr || value == nullptr) {

@@ -6,8 +6,12 @@ thread_local int lastError = QLIBC_ERR_NONE;
 
 extern "C" {
 
-int QLIBCErrGet(void) { return lastError; }
+int QLIBCErrGet(void) {
+    return lastError;
+}
 
-void QLIBCErrSet(int code) { lastError = code; }
+void QLIBCErrSet(int code) {
+    lastError = code;
+}
 
 }  // extern "C"

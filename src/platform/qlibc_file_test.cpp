@@ -37,7 +37,7 @@ Pairs ToPairs(const QLIBSZHASH* hash) {
 }
 
 class QlibcFileTest : public vorn::test::RootTest {
-protected:
+  protected:
     std::vector<std::string> Sections(const char* file) {
         QLIBSZLIST* list = nullptr;
         std::vector<std::string> names;
@@ -184,13 +184,16 @@ TEST_F(QlibcFileTest, SectionsWriteAndReadBack) {
     EXPECT_EQ(QLIBCFileHash2File(stream, "1", pairs.get(), "%s=%d\n"), -1);
     EXPECT_EQ(QLIBCFileHash2File(stream, "1", pairs.get(), "%s\n"), -1);
     std::fclose(stream);
-    EXPECT_EQ(root_.ReadFile("/etc/w.conf"), "[0]\n\tifname=eth0\n\tgateway= 10.0.0.1\n\tnote=a=b #c\n");
+    EXPECT_EQ(root_.ReadFile("/etc/w.conf"),
+              "[0]\n\tifname=eth0\n\tgateway= 10.0.0.1\n\tnote=a=b #c\n");
     EXPECT_EQ(Section("/etc/w.conf", "0"), ToPairs(pairs.get()));
 
     // AddSection replaces a section where it stands and appends a new one.
     root_.WriteFile("/etc/r.conf", "[conf]\nold=1\n[addr]\na=1\n[conf]\nold=2\n");
-    ASSERT_EQ(QLIBCFileAddSection("/etc/r.conf", "conf", MakeHash({{"k", "v"}}).get(), "\t%s=%s\n"), 0);
-    ASSERT_EQ(QLIBCFileAddSection("/etc/r.conf", "lan", MakeHash({{"p", "q"}}).get(), "\t%s=%s\n"), 0);
+    ASSERT_EQ(QLIBCFileAddSection("/etc/r.conf", "conf", MakeHash({{"k", "v"}}).get(), "\t%s=%s\n"),
+              0);
+    ASSERT_EQ(QLIBCFileAddSection("/etc/r.conf", "lan", MakeHash({{"p", "q"}}).get(), "\t%s=%s\n"),
+              0);
     EXPECT_EQ(root_.ReadFile("/etc/r.conf"), "[conf]\n\tk=v\n[addr]\na=1\n[lan]\n\tp=q\n");
     ASSERT_EQ(QLIBCFileAddSection("/etc/new/r.conf", "conf", pairs.get(), "\t%s=%s\n"), -1);
 }

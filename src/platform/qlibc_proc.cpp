@@ -27,7 +27,7 @@ int Fail(int code) {
 }
 
 class SpawnActions {
-public:
+  public:
     SpawnActions() { posix_spawn_file_actions_init(&actions_); }
     ~SpawnActions() { posix_spawn_file_actions_destroy(&actions_); }
     SpawnActions(const SpawnActions&) = delete;
@@ -38,14 +38,14 @@ public:
     }
     const posix_spawn_file_actions_t* Get() const { return &actions_; }
 
-private:
+  private:
     posix_spawn_file_actions_t actions_;
 };
 
 // The child starts with default signal handling and nothing blocked, whatever the daemon's
 // threads have set up for themselves.
 class SpawnAttributes {
-public:
+  public:
     SpawnAttributes() {
         posix_spawnattr_init(&attr_);
         sigset_t none;
@@ -61,7 +61,7 @@ public:
     SpawnAttributes& operator=(const SpawnAttributes&) = delete;
     const posix_spawnattr_t* Get() const { return &attr_; }
 
-private:
+  private:
     posix_spawnattr_t attr_;
 };
 
@@ -106,7 +106,8 @@ int Run(const char* program, int flags, const std::vector<const char*>& args) {
     int result = 0;
     if (program[0] == '/') {
         const std::string path = vorn::platform::RootPath(program);
-        result = posix_spawn(&pid, path.c_str(), actions.Get(), attributes.Get(), argv.data(), environ);
+        result =
+            posix_spawn(&pid, path.c_str(), actions.Get(), attributes.Get(), argv.data(), environ);
     } else {
         result = posix_spawnp(&pid, program, actions.Get(), attributes.Get(), argv.data(), environ);
     }
@@ -128,7 +129,8 @@ int QLIBCExecl(const char* program, int flags, ...) {
     std::vector<const char*> args;
     va_list list;
     va_start(list, flags);
-    for (const char* arg = va_arg(list, const char*); arg != nullptr; arg = va_arg(list, const char*)) {
+    for (const char* arg = va_arg(list, const char*); arg != nullptr;
+         arg = va_arg(list, const char*)) {
         args.push_back(arg);
     }
     va_end(list);

@@ -7,10 +7,10 @@ extern "C" {
 
 /* Flags of QLIBCExecl. Bits not listed are accepted and ignored. */
 enum {
-    QLIBC_EXEC_WAIT = 0x01,       /* wait for the program and report its exit status */
-    QLIBC_EXEC_NO_STDOUT = 0x02,  /* standard output to /dev/null */
-    QLIBC_EXEC_NO_STDERR = 0x08,  /* standard error to /dev/null */
-    QLIBC_EXEC_NO_STDIN = 0x10    /* standard input from /dev/null */
+    QLIBC_EXEC_WAIT = 0x01,      /* wait for the program and report its exit status */
+    QLIBC_EXEC_NO_STDOUT = 0x02, /* standard output to /dev/null */
+    QLIBC_EXEC_NO_STDERR = 0x08, /* standard error to /dev/null */
+    QLIBC_EXEC_NO_STDIN = 0x10   /* standard input from /dev/null */
 };
 
 /* Runs program with the argument words that follow flags, ending in a null pointer. An absolute

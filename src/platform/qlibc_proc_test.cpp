@@ -33,10 +33,10 @@ TEST_F(QlibcProcTest, ProgramsRunUnderTheRootWithTheirArgumentWords) {
     // A bare name is found on PATH, which the fixture starts with the root's folders.
     EXPECT_EQ(QLIBCExecl("iwconfig", QLIBC_EXEC_WAIT, "wlan0", static_cast<char*>(nullptr)), 0);
     EXPECT_EQ(QLIBCExecl("/sbin/none", QLIBC_EXEC_WAIT, static_cast<char*>(nullptr)), -1);
-    EXPECT_EQ(root_.Calls(), (Calls{"/sbin/ip route add default via 10.0.0.1 dev eth0",
-                                    "/sbin/ip route add default via 10.0.0.9 dev eth0",
-                                    "/usr/vorn/sbin/brctl addif br0 'it'\\''s here'",
-                                    "/sbin/iwconfig wlan0"}));
+    EXPECT_EQ(root_.Calls(),
+              (Calls{"/sbin/ip route add default via 10.0.0.1 dev eth0",
+                     "/sbin/ip route add default via 10.0.0.9 dev eth0",
+                     "/usr/vorn/sbin/brctl addif br0 'it'\\''s here'", "/sbin/iwconfig wlan0"}));
 }
 
 TEST_F(QlibcProcTest, ShellLinesAndBackgroundRuns) {

@@ -14,7 +14,8 @@ TEST(QlibcStrTest, SplitsDottedAddresses) {
     EXPECT_EQ(parts[3], 77u);
     EXPECT_EQ(cQLIBISepIP("10.1", parts, 4), 2);
     EXPECT_EQ(cQLIBISepIP("1.2.3.4.5", parts, 4), 5);
-    for (const char* bad : {"", "1..2.3", "1.2.3.", "256.1.1.1", "1.2.3.4x", "a.b.c.d", "1.2.3.0004"}) {
+    for (const char* bad :
+         {"", "1..2.3", "1.2.3.", "256.1.1.1", "1.2.3.4x", "a.b.c.d", "1.2.3.0004"}) {
         EXPECT_EQ(cQLIBISepIP(bad, parts, 4), -1) << bad;
     }
     EXPECT_EQ(cQLIBISepIP(nullptr, parts, 4), -1);
@@ -29,7 +30,8 @@ TEST(QlibcStrTest, TrimsAndSeparates) {
     char list[] = "a,,b;c";
     char* cursor = list;
     std::string seen;
-    for (char* token = QLIBCStrSep(&cursor, ",;"); token != nullptr; token = QLIBCStrSep(&cursor, ",;")) {
+    for (char* token = QLIBCStrSep(&cursor, ",;"); token != nullptr;
+         token = QLIBCStrSep(&cursor, ",;")) {
         seen += std::string("[") + token + "]";
     }
     EXPECT_EQ(seen, "[a][][b][c]");

@@ -108,7 +108,8 @@ void PrefixPathWithRoot() {
         return;
     }
     std::string path;
-    for (const char* dir : {"/usr/vorn/bin", "/usr/vorn/sbin", "/usr/sbin", "/usr/bin", "/sbin", "/bin"}) {
+    for (const char* dir :
+         {"/usr/vorn/bin", "/usr/vorn/sbin", "/usr/sbin", "/usr/bin", "/sbin", "/bin"}) {
         path += root + dir + ":";
     }
     const char* old = std::getenv("PATH");

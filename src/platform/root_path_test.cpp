@@ -9,7 +9,7 @@ namespace platform {
 namespace {
 
 class RootPathTest : public ::testing::Test {
-protected:
+  protected:
     void SetUp() override { setenv("VORN_ROOT", "/tmp/r oot/", 1); }
     void TearDown() override { unsetenv("VORN_ROOT"); }
 };
@@ -18,10 +18,12 @@ TEST_F(RootPathTest, PathsAndProgramsMoveUnderTheRoot) {
     EXPECT_EQ(Root(), "/tmp/r oot");
     EXPECT_EQ(RootPath("/etc/vorninfo.conf"), "/tmp/r oot/etc/vorninfo.conf");
     EXPECT_EQ(RootPath("relative/file"), "relative/file");
-    EXPECT_EQ(ShellRootPath("/usr/vorn/etc/wifi/wifi_ap_*"), "'/tmp/r oot'/usr/vorn/etc/wifi/wifi_ap_*");
+    EXPECT_EQ(ShellRootPath("/usr/vorn/etc/wifi/wifi_ap_*"),
+              "'/tmp/r oot'/usr/vorn/etc/wifi/wifi_ap_*");
 
-    EXPECT_EQ(RootShellCommand("/bin/ps -I | /bin/grep 'a|/x' | /bin/grep -v grep"),
-              "'/tmp/r oot'/bin/ps -I | '/tmp/r oot'/bin/grep 'a|/x' | '/tmp/r oot'/bin/grep -v grep");
+    EXPECT_EQ(
+        RootShellCommand("/bin/ps -I | /bin/grep 'a|/x' | /bin/grep -v grep"),
+        "'/tmp/r oot'/bin/ps -I | '/tmp/r oot'/bin/grep 'a|/x' | '/tmp/r oot'/bin/grep -v grep");
     // Arguments and redirections stay; programs after ;, && and ( move.
     EXPECT_EQ(RootShellCommand("/bin/ls /a 2>/dev/null&&(/usr/bin/wc -l);echo \"/x;/y\""),
               "'/tmp/r oot'/bin/ls /a 2>/dev/null&&('/tmp/r oot'/usr/bin/wc -l);echo \"/x;/y\"");

@@ -29,7 +29,9 @@ bool IsCommentOrBlank(const std::string& line, size_t start) {
     return start == std::string::npos || line[start] == '#' || line[start] == ';';
 }
 
-bool HasLineEnd(const std::string& text) { return text.find_first_of("\r\n") != std::string::npos; }
+bool HasLineEnd(const std::string& text) {
+    return text.find_first_of("\r\n") != std::string::npos;
+}
 
 bool WriteAll(int fd, const std::string& content) {
     size_t done = 0;
@@ -236,7 +238,9 @@ bool IsWritableKey(const std::string& key) {
            !HasLineEnd(key) && key[0] != '#' && key[0] != ';' && key[0] != '[';
 }
 
-bool IsWritableValue(const std::string& value) { return !HasLineEnd(value); }
+bool IsWritableValue(const std::string& value) {
+    return !HasLineEnd(value);
+}
 
 bool IsWritableSectionName(const std::string& name) {
     return name.find(']') == std::string::npos && !HasLineEnd(name);

@@ -22,7 +22,9 @@ constexpr int kHashCapacity = 1024;
 constexpr size_t kPathBuffer = 1024;
 constexpr const char* kTempSuffix = ".tmp.XXXXXX";
 
-std::string ToText(bool value) { return value ? "yes" : "no"; }
+std::string ToText(bool value) {
+    return value ? "yes" : "no";
+}
 
 template <typename Number>
 std::string ToText(Number value) {
@@ -59,7 +61,7 @@ struct ListHolder {
 
 // The temporary file of a sectioned write: made under the root, named by its logical path.
 class TempFile {
-public:
+  public:
     explicit TempFile(const std::string& logicalName) {
         char logical[kPathBuffer] = {};
         std::snprintf(logical, sizeof(logical), "%s%s", logicalName.c_str(), kTempSuffix);
@@ -97,7 +99,7 @@ public:
         return ok;
     }
 
-private:
+  private:
     std::string logical_;
     int fd_ = -1;
     FILE* stream_ = nullptr;
@@ -161,7 +163,8 @@ int ConfigSection::Write() {
         return -1;
     }
     if (QLIBCSysRename(temp.c_str(), GetNameCString()) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to rename file from [%s] to [%s]", temp.c_str(), GetNameCString());
+        VORN_LOG(LOG_ERR, "Failed to rename file from [%s] to [%s]", temp.c_str(),
+                 GetNameCString());
         return -1;
     }
     return 0;

@@ -9,7 +9,7 @@ namespace utils {
 
 // A setting file held whole in memory. Values are text; typed setters store bools as "yes"/"no".
 class Config {
-public:
+  public:
     Config() = default;
     explicit Config(const std::string& name) : name_(name) {}
     virtual ~Config() = default;
@@ -23,17 +23,17 @@ public:
     // The directory part of the file name, as dirname(3) gives it ("." without a slash).
     std::string GetDirName() const;
 
-protected:
+  protected:
     // Ensures the file's directory exists (created 0755).
     int MakeDirectory() const;
 
-private:
+  private:
     std::string name_;
 };
 
 // A file of named sections holding key=value pairs. Written atomically (temporary file + rename).
 class ConfigSection : public Config {
-public:
+  public:
     using Section = std::map<std::string, std::string>;
     using Sections = std::map<std::string, Section>;
 
@@ -59,7 +59,7 @@ public:
     void AddKeyValue(const std::string& section, const std::string& key, double value);
     void AddKeyValue(const std::string& section, const std::string& key, int value);
 
-private:
+  private:
     int WriteTemp(std::string& tempPath) const;
 
     Sections sections_;
@@ -67,7 +67,7 @@ private:
 
 // A flat key=value file. Written in place (removed, then created anew), not atomically.
 class ConfigNoSection : public Config {
-public:
+  public:
     using Pairs = std::map<std::string, std::string>;
 
     ConfigNoSection() = default;
@@ -87,7 +87,7 @@ public:
     void AddKeyValue(const std::string& key, double value);
     void AddKeyValue(const std::string& key, int value);
 
-private:
+  private:
     Pairs pairs_;
 };
 

@@ -14,7 +14,7 @@ namespace utils {
 namespace {
 
 class ConfigTest : public vorn::test::RootTest {
-protected:
+  protected:
     // Files of a directory whose names start with prefix (temporary files left behind).
     std::vector<std::string> Leftovers(const std::string& dir, const std::string& prefix) {
         std::vector<std::string> found;

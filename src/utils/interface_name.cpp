@@ -1,6 +1,5 @@
 #include "utils/interface_name.h"
 
-
 namespace vornwireless {
 namespace utils {
 
@@ -9,7 +8,8 @@ bool IsValidInterfaceName(const std::string& name) {
         return false;
     }
     for (char c : name) {
-        const bool alnum = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
+        const bool alnum =
+            (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
         if (!alnum && std::string("-_.:@+").find(c) == std::string::npos) {
             return false;
         }

@@ -27,7 +27,9 @@ bool ParseJson(const std::string& text, Json::Value& value) {
     return true;
 }
 
-std::string StyledJson(const Json::Value& value) { return value.toStyledString(); }
+std::string StyledJson(const Json::Value& value) {
+    return value.toStyledString();
+}
 
 std::string CompactJson(const Json::Value& value) {
     Json::StreamWriterBuilder builder;

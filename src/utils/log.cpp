@@ -27,7 +27,9 @@ void SetSink(Sink sink) {
     CurrentSink() = std::move(sink);
 }
 
-void SyslogSink(int priority, const std::string& line) { syslog(priority, "%s", line.c_str()); }
+void SyslogSink(int priority, const std::string& line) {
+    syslog(priority, "%s", line.c_str());
+}
 
 void SyslogAndStderrSink(int priority, const std::string& line) {
     SyslogSink(priority, line);

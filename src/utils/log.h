@@ -44,6 +44,7 @@ constexpr const char* BaseName(const char* path) {
 #endif
 
 // VORN_LOG(LOG_ERR, "Failed to open [%s]", path): one line, prefixed with the source file and line.
-#define VORN_LOG(priority, ...) ::vorn::log::Write((priority), VORN_FILE_NAME, __LINE__, __VA_ARGS__)
+#define VORN_LOG(priority, ...) \
+    ::vorn::log::Write((priority), VORN_FILE_NAME, __LINE__, __VA_ARGS__)
 
 #endif

@@ -12,7 +12,9 @@ LogCapture::LogCapture() {
     });
 }
 
-LogCapture::~LogCapture() { log::SetSink(nullptr); }
+LogCapture::~LogCapture() {
+    log::SetSink(nullptr);
+}
 
 std::vector<std::string> LogCapture::Lines() const {
     std::lock_guard<std::mutex> lock(mutex_);

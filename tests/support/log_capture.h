@@ -10,7 +10,7 @@ namespace test {
 
 // Takes over the process-wide log sink while it lives and keeps every line.
 class LogCapture {
-public:
+  public:
     LogCapture();
     ~LogCapture();
     LogCapture(const LogCapture&) = delete;
@@ -22,7 +22,7 @@ public:
     bool Contains(const std::string& text) const { return !Matching(text).empty(); }
     void Clear();
 
-private:
+  private:
     mutable std::mutex mutex_;
     std::vector<std::string> lines_;
 };

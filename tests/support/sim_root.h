@@ -44,6 +44,7 @@ private:
     std::string savedRoot_;
     std::string savedPath_;
     bool hadRoot_ = false;
+    bool hadPath_ = false;
 };
 
 // Base fixture of unit tests: a fresh simulated root and captured log lines for every test.

@@ -29,7 +29,8 @@ struct Command {
     const char* help;
     Argument argument;
     // Runs the call; data receives the answer of methods that have one.
-    std::function<int(NetClient&, const std::string& text, Json::Value& request, Json::Value& data)> call;
+    std::function<int(NetClient&, const std::string& text, Json::Value& request, Json::Value& data)>
+        call;
     bool hasAnswer;
 };
 
@@ -37,17 +38,25 @@ const std::vector<Command>& Commands() {
     static const std::vector<Command> commands = {
         {"--get-device-list", "TYPE", "GetDeviceListData: the LAN devices found by a scanner type",
          Argument::kText,
-         [](NetClient& c, const std::string& t, Json::Value&, Json::Value& d) { return c.GetDeviceListData(t, d); },
+         [](NetClient& c, const std::string& t, Json::Value&, Json::Value& d) {
+             return c.GetDeviceListData(t, d);
+         },
          true},
         {"--set-device-list", "JSON", "SetDeviceListData: name or type a device", Argument::kJson,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) { return c.SetDeviceListData(r); },
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) {
+             return c.SetDeviceListData(r);
+         },
          false},
         {"--del-device-list", "MAC", "DelDeviceListData: forget a device", Argument::kText,
-         [](NetClient& c, const std::string& t, Json::Value&, Json::Value&) { return c.DelDeviceListData(t); },
+         [](NetClient& c, const std::string& t, Json::Value&, Json::Value&) {
+             return c.DelDeviceListData(t);
+         },
          false},
         {"--get-gateway-list", "v4|v6|JSON", "GetGatewayListData: the gateway candidates in order",
          Argument::kGatewayType,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value& d) { return c.GetGatewayListData(r, d); },
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value& d) {
+             return c.GetGatewayListData(r, d);
+         },
          true},
         {"--get-gateway", "JSON", "GetGatewayDataByInterface: one interface's gateway entry",
          Argument::kJson,
@@ -56,26 +65,39 @@ const std::vector<Command>& Commands() {
          },
          true},
         {"--add-gateway", "JSON", "AddGatewayData: add or update a gateway entry", Argument::kJson,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) { return c.AddGatewayData(r); },
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) {
+             return c.AddGatewayData(r);
+         },
          false},
         {"--del-gateway", "JSON", "DelGatewayData: remove an interface's gateway entry",
          Argument::kJson,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) { return c.DelGatewayData(r); },
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) {
+             return c.DelGatewayData(r);
+         },
          false},
-        {"--set-slave", "JSON", "SetSlaveData: mark an interface as enslaved or not", Argument::kJson,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) { return c.SetSlaveData(r); },
+        {"--set-slave", "JSON", "SetSlaveData: mark an interface as enslaved or not",
+         Argument::kJson,
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) {
+             return c.SetSlaveData(r);
+         },
          false},
         {"--copy-gateway", "JSON", "CopyGatewayData: copy an entry to another interface",
          Argument::kJson,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) { return c.CopyGatewayData(r); },
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) {
+             return c.CopyGatewayData(r);
+         },
          false},
         {"--refresh-gateway", "v4|v6|all|JSON", "RefreshGateway: install the best default route",
          Argument::kGatewayType,
-         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) { return c.RefreshGateway(r); },
+         [](NetClient& c, const std::string&, Json::Value& r, Json::Value&) {
+             return c.RefreshGateway(r);
+         },
          false},
-        {"--reset-ipv6-module", "IFNAME", "ResetIPv6Module: apply the next router advertisement again",
-         Argument::kText,
-         [](NetClient& c, const std::string& t, Json::Value&, Json::Value&) { return c.ResetIPv6Module(t); },
+        {"--reset-ipv6-module", "IFNAME",
+         "ResetIPv6Module: apply the next router advertisement again", Argument::kText,
+         [](NetClient& c, const std::string& t, Json::Value&, Json::Value&) {
+             return c.ResetIPv6Module(t);
+         },
          false},
     };
     return commands;
@@ -92,11 +114,12 @@ void Usage(FILE* out) {
     for (const Command& command : Commands()) {
         std::fprintf(out, "  %s %-16s %s\n", command.option, command.operand, command.help);
     }
-    std::fprintf(out,
-                 "  --ready                           exit 0 when vornnetd runs and owns its name\n\n"
-                 "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
-                 "Example: vornnetdtool --add-gateway "
-                 "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n");
+    std::fprintf(
+        out,
+        "  --ready                           exit 0 when vornnetd runs and owns its name\n\n"
+        "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
+        "Example: vornnetdtool --add-gateway "
+        "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n");
 }
 
 bool BuildRequest(const Command& command, const std::string& text, Json::Value& request) {
@@ -155,8 +178,9 @@ int main(int argc, char** argv) {
         }
     }
     if (command == nullptr || words.size() != 2) {
-        std::fprintf(stderr, "vornnetdtool: %s\n",
-                     words.empty() ? "no command given" : "unknown command or wrong number of arguments");
+        std::fprintf(
+            stderr, "vornnetdtool: %s\n",
+            words.empty() ? "no command given" : "unknown command or wrong number of arguments");
         Usage(stderr);
         return 2;
     }

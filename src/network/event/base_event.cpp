@@ -11,7 +11,9 @@ bool BaseEvent::IsValidEvent(EVENT_TYPE type) {
     return static_cast<unsigned int>(type) - 1u <= 1u;
 }
 
-std::string BaseEvent::ToStr() const { return "event:[" + std::to_string(type_) + "]"; }
+std::string BaseEvent::ToStr() const {
+    return "event:[" + std::to_string(type_) + "]";
+}
 
 int BaseEvent::Process() {
     if (notified_ && processed_) {

@@ -15,7 +15,7 @@ enum EVENT_TYPE : std::int32_t {
 
 // An event is delivered to the subscribed modules, then processed by itself, each at most once.
 class BaseEvent {
-public:
+  public:
     explicit BaseEvent(EVENT_TYPE type) : type_(type) {}
     virtual ~BaseEvent() = default;
 
@@ -34,7 +34,7 @@ public:
     bool IsNotified() const { return notified_; }
     bool IsProcessed() const { return processed_; }
 
-private:
+  private:
     EVENT_TYPE type_;
     bool notified_ = false;
     bool processed_ = false;

@@ -15,7 +15,7 @@ namespace module {
 // Event type -> handlers in registration order; at most one handler per module and event, and no
 // event without handlers.
 class EventTable {
-public:
+  public:
     using Handlers = std::vector<EventHandler>;
     using Table = std::map<event::EVENT_TYPE, Handlers>;
     using iterator = Table::iterator;
@@ -35,7 +35,7 @@ public:
 
     std::string ToStr() const;
 
-private:
+  private:
     const Handlers empty_;
     Table table_;
 };

@@ -42,7 +42,8 @@ TEST(EventTableTest, OneHandlerPerModuleAndEventInRegistrationOrder) {
     EXPECT_TRUE(table.ListHandlers(EVENT_HELLO).empty());
     EXPECT_EQ(table.Remove(EVENT_RESERVED_2, MODULE_NETLINK), 0);
     ASSERT_EQ(table.ListHandlers(EVENT_RESERVED_2).size(), 1u);
-    EXPECT_TRUE(table.ListHandlers(EVENT_RESERVED_2)[0] == EventHandler(MODULE_DEVICE_LIST, kHello));
+    EXPECT_TRUE(table.ListHandlers(EVENT_RESERVED_2)[0] ==
+                EventHandler(MODULE_DEVICE_LIST, kHello));
     EXPECT_EQ(table.Remove(table.FindEvent(EVENT_HELLO), MODULE_TEST), 0);
 }
 

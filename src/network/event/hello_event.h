@@ -11,14 +11,14 @@ namespace event {
 
 // The one concrete event: carries a text message.
 class HelloEvent : public BaseEvent {
-public:
+  public:
     explicit HelloEvent(const std::string& msg) : BaseEvent(EVENT_HELLO), msg_(msg) {}
 
     bool IsValid() const override { return !msg_.empty(); }
     std::string ToStr() const override;
     int ProcessEvent() override;
 
-private:
+  private:
     std::string msg_;
 };
 

@@ -13,7 +13,9 @@ int BaseModule::ProcessRequest(const Json::Value& request, Json::Value& answer) 
     return 0;
 }
 
-std::string BaseModule::ToStr() const { return "module:" + std::to_string(type_); }
+std::string BaseModule::ToStr() const {
+    return "module:" + std::to_string(type_);
+}
 
 bool BaseModule::IsValidModule(MODULE_TYPE type) {
     return static_cast<unsigned int>(type) - 1u <= 4u;

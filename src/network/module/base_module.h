@@ -23,7 +23,7 @@ enum MODULE_STATUS {
 // A module of the network daemon: initialised, started and terminated by the module manager,
 // answering JSON requests and optionally handling events.
 class BaseModule {
-public:
+  public:
     explicit BaseModule(MODULE_TYPE type) : type_(type) {}
     virtual ~BaseModule() = default;
     BaseModule(const BaseModule&) = delete;
@@ -52,7 +52,7 @@ public:
     int GetStatus() const { return status_; }
     MODULE_TYPE GetType() const { return type_; }
 
-private:
+  private:
     int status_ = MODULE_STATUS_TERMINATED;
     MODULE_TYPE type_;
     PthreadMutex mutex_;

@@ -9,15 +9,15 @@ namespace module {
 namespace {
 
 // The rows of modules that are not part of this build yet create nothing.
-BaseModule* NotBuiltYet() { return nullptr; }
+BaseModule* NotBuiltYet() {
+    return nullptr;
+}
 
 }  // namespace
 
 const ModuleManager::MODULE_INFO ModuleManager::module_info[5] = {
-    {MODULE_TEST, false, &TestModule::Create},
-    {MODULE_NETLINK, true, &NotBuiltYet},
-    {MODULE_IPV6, true, &NotBuiltYet},
-    {MODULE_ROUTE, true, &NotBuiltYet},
+    {MODULE_TEST, false, &TestModule::Create}, {MODULE_NETLINK, true, &NotBuiltYet},
+    {MODULE_IPV6, true, &NotBuiltYet},         {MODULE_ROUTE, true, &NotBuiltYet},
     {MODULE_DEVICE_LIST, true, &NotBuiltYet},
 };
 

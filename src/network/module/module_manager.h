@@ -17,7 +17,7 @@ namespace module {
 // delivers events to their handlers and routes requests by module type. Takes no lock: Initialize
 // and Start run once before requests are served.
 class ModuleManager {
-public:
+  public:
     struct MODULE_INFO {
         MODULE_TYPE type;
         bool enabled;
@@ -47,7 +47,7 @@ public:
 
     static const MODULE_INFO module_info[5];
 
-private:
+  private:
     ModuleManager() = default;
     ModuleManager(const ModuleManager&) = delete;
     ModuleManager& operator=(const ModuleManager&) = delete;

@@ -16,7 +16,7 @@ namespace {
 
 // A module whose steps answer as the test says and leave a trace of their order.
 class ScriptedModule : public BaseModule {
-public:
+  public:
     explicit ScriptedModule(MODULE_TYPE type) : BaseModule(type) {}
     int InitialModule() override { return Record("init", initResult); }
     int StartModule() override { return Record("start", 0); }
@@ -32,7 +32,7 @@ public:
     int eventResult = 0;
     static std::vector<std::string> trace;
 
-private:
+  private:
     int Record(const char* step, int result) {
         trace.push_back(std::to_string(GetType()) + ":" + step);
         return result;
@@ -45,15 +45,18 @@ template <MODULE_TYPE Type>
 BaseModule* CreateScripted() {
     return scripted[Type] = new ScriptedModule(Type);
 }
-BaseModule* CreateNothing() { return nullptr; }
+BaseModule* CreateNothing() {
+    return nullptr;
+}
 
 const EventHandler::Handler kOnEvent = static_cast<EventHandler::Handler>(&ScriptedModule::OnEvent);
 
 class ModuleManagerTest : public ::testing::Test {
-protected:
+  protected:
     void SetUp() override { ScriptedModule::trace.clear(); }
     void TearDown() override {
-        for (MODULE_TYPE type : {MODULE_TEST, MODULE_IPV6, MODULE_ROUTE, MODULE_DEVICE_LIST, MODULE_NETLINK}) {
+        for (MODULE_TYPE type :
+             {MODULE_TEST, MODULE_IPV6, MODULE_ROUTE, MODULE_DEVICE_LIST, MODULE_NETLINK}) {
             manager_->UnHookEvent(event::EVENT_HELLO, type);
             manager_->RemoveModule(type);
         }
@@ -76,7 +79,8 @@ TEST_F(ModuleManagerTest, LifecycleRunsInTypeOrderAndNeverStopsEarly) {
 
     scripted[MODULE_ROUTE]->initResult = -7;
     EXPECT_FALSE(manager_->InitModules());
-    EXPECT_EQ(ScriptedModule::trace, (std::vector<std::string>{"2:init", "3:init", "3:terminate", "5:init"}));
+    EXPECT_EQ(ScriptedModule::trace,
+              (std::vector<std::string>{"2:init", "3:init", "3:terminate", "5:init"}));
     EXPECT_TRUE(log_.Contains("Failed to init module [3]"));
     EXPECT_EQ(scripted[MODULE_ROUTE]->GetStatus(), MODULE_STATUS_TERMINATED);
 
@@ -96,7 +100,8 @@ TEST_F(ModuleManagerTest, LifecycleRunsInTypeOrderAndNeverStopsEarly) {
 
 TEST_F(ModuleManagerTest, RequestsAndEventsReachTheirModules) {
     ASSERT_TRUE(manager_->AddModule({MODULE_ROUTE, true, &CreateScripted<MODULE_ROUTE>}));
-    ASSERT_TRUE(manager_->AddModule({MODULE_DEVICE_LIST, true, &CreateScripted<MODULE_DEVICE_LIST>}));
+    ASSERT_TRUE(
+        manager_->AddModule({MODULE_DEVICE_LIST, true, &CreateScripted<MODULE_DEVICE_LIST>}));
     Json::Value request;
     request["method"] = "GET";
     Json::Value answer;

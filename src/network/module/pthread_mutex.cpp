@@ -14,7 +14,9 @@ PthreadMutex::PthreadMutex() {
     }
 }
 
-PthreadMutex::~PthreadMutex() { pthread_mutex_destroy(&mutex_); }
+PthreadMutex::~PthreadMutex() {
+    pthread_mutex_destroy(&mutex_);
+}
 
 }  // namespace network
 }  // namespace vornnetwork

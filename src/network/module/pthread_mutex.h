@@ -7,7 +7,7 @@ namespace vornnetwork {
 namespace network {
 
 class PthreadMutex {
-public:
+  public:
     PthreadMutex();
     ~PthreadMutex();
     PthreadMutex(const PthreadMutex&) = delete;
@@ -17,7 +17,7 @@ public:
     bool Unlock() { return pthread_mutex_unlock(&mutex_) == 0; }
     bool TryLock() { return pthread_mutex_trylock(&mutex_) == 0; }
 
-private:
+  private:
     pthread_mutex_t mutex_;
 };
 

@@ -10,7 +10,9 @@ TestModule::TestModule() : BaseModule(MODULE_TEST) {
     VORN_LOG(LOG_ERR, "Constructor of Test Module");
 }
 
-TestModule::~TestModule() { VORN_LOG(LOG_ERR, "Destructor of Test Module"); }
+TestModule::~TestModule() {
+    VORN_LOG(LOG_ERR, "Destructor of Test Module");
+}
 
 int TestModule::ProcessRequest(const Json::Value& request, Json::Value& answer) {
     (void)request;
@@ -35,8 +37,8 @@ int TestModule::StartModule() {
 }
 
 int TestModule::HookEvents() const {
-    if (HookEvent(event::EVENT_HELLO, static_cast<EventHandler::Handler>(&TestModule::OnHelloEvent)) !=
-        0) {
+    if (HookEvent(event::EVENT_HELLO,
+                  static_cast<EventHandler::Handler>(&TestModule::OnHelloEvent)) != 0) {
         VORN_LOG(LOG_ERR, "Failed to hook hello event by test module");
         return -1;
     }

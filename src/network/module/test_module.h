@@ -9,7 +9,7 @@ namespace module {
 
 // The smallest module: logs its lifecycle and subscribes to the hello event.
 class TestModule : public BaseModule {
-public:
+  public:
     TestModule();
     ~TestModule() override;
 
