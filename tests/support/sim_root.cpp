@@ -1,0 +1,157 @@
+#include "support/sim_root.h"
+
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <vector>
+
+#include "platform/root_path.h"
+
+extern char** environ;
+
+namespace vorn {
+namespace test {
+namespace {
+
+namespace fs = std::filesystem;
+
+const char kCallLog[] = "/.vornsim/calls";
+const char kScenarioDir[] = "/.vornsim/scenario/";
+
+// A root that cannot be built leaves nothing meaningful to test: stop the whole run.
+[[noreturn]] void Die(const std::string& what) {
+    std::fprintf(stderr, "SimRoot: %s\n", what.c_str());
+    std::abort();
+}
+
+std::string MakeTempDir() {
+    const char* tmp = std::getenv("TMPDIR");
+    std::string pattern =
+        std::string(tmp != nullptr && *tmp != '\0' ? tmp : "/tmp") + "/vorn-root-XXXXXX";
+    if (mkdtemp(&pattern[0]) == nullptr) {
+        Die("mkdtemp " + pattern + ": " + std::strerror(errno));
+    }
+    return pattern;
+}
+
+void RunMakeRoot(SimRoot::Kind kind, const std::string& dir) {
+    std::string program = VORN_SOURCE_DIR "/sim/make-root";
+    std::string live = "--live";
+    std::vector<char*> argv{&program[0]};
+    if (kind == SimRoot::Kind::kLive) {
+        argv.push_back(&live[0]);
+    }
+    std::string target = dir;
+    argv.push_back(&target[0]);
+    argv.push_back(nullptr);
+
+    pid_t pid = 0;
+    const int error = posix_spawn(&pid, program.c_str(), nullptr, nullptr, argv.data(), environ);
+    if (error != 0) {
+        Die("cannot run " + program + ": " + std::strerror(error));
+    }
+    int status = 0;
+    while (waitpid(pid, &status, 0) < 0) {
+        if (errno != EINTR) {
+            Die("waitpid for " + program + ": " + std::strerror(errno));
+        }
+    }
+    if (!WIFEXITED(status) || WEXITSTATUS(status) != 0) {
+        Die(program + " " + dir + " failed (status " + std::to_string(status) + ")");
+    }
+}
+
+void SaveVariable(const char* name, std::string& value, bool& had) {
+    const char* current = std::getenv(name);
+    had = current != nullptr;
+    value = had ? current : "";
+}
+
+void RestoreVariable(const char* name, const std::string& value, bool had) {
+    if (had) {
+        setenv(name, value.c_str(), 1);
+    } else {
+        unsetenv(name);
+    }
+}
+
+}  // namespace
+
+SimRoot::SimRoot(Kind kind) : dir_(MakeTempDir()) {
+    RunMakeRoot(kind, dir_);
+    SaveVariable("VORN_ROOT", savedRoot_, hadRoot_);
+    SaveVariable("PATH", savedPath_, hadPath_);
+    setenv("VORN_ROOT", dir_.c_str(), 1);
+    platform::PrefixPathWithRoot();
+}
+
+SimRoot::~SimRoot() {
+    RestoreVariable("VORN_ROOT", savedRoot_, hadRoot_);
+    RestoreVariable("PATH", savedPath_, hadPath_);
+    std::error_code ignored;
+    fs::remove_all(dir_, ignored);
+}
+
+std::string SimRoot::Path(const std::string& logical) const {
+    return !logical.empty() && logical[0] == '/' ? dir_ + logical : dir_ + "/" + logical;
+}
+
+bool SimRoot::Exists(const std::string& logical) const {
+    std::error_code ignored;
+    return fs::exists(Path(logical), ignored);
+}
+
+void SimRoot::WriteFile(const std::string& logical, const std::string& content) const {
+    const fs::path path = Path(logical);
+    std::error_code error;
+    fs::create_directories(path.parent_path(), error);
+    std::ofstream out(path, std::ios::binary | std::ios::trunc);
+    out << content;
+    out.close();
+    if (error || !out) {
+        ADD_FAILURE() << "cannot write " << path;
+    }
+}
+
+std::string SimRoot::ReadFile(const std::string& logical) const {
+    // Streamed, so that files of /proc and /sys in a live root read whole.
+    std::ifstream in(Path(logical), std::ios::binary);
+    std::ostringstream content;
+    if (in) {
+        content << in.rdbuf();
+    }
+    return content.str();
+}
+
+void SimRoot::Scenario(const std::string& program, const std::string& text) const {
+    if (program.empty() || program.find('/') != std::string::npos) {
+        ADD_FAILURE() << "a scenario is named by the program's base name, not '" << program << "'";
+        return;
+    }
+    WriteFile(kScenarioDir + program, text);
+}
+
+std::vector<std::string> SimRoot::Calls() const {
+    std::istringstream log(ReadFile(kCallLog));
+    std::vector<std::string> calls;
+    for (std::string line; std::getline(log, line);) {
+        calls.push_back(line);
+    }
+    return calls;
+}
+
+void SimRoot::ClearCalls() const {
+    std::error_code ignored;
+    fs::remove(Path(kCallLog), ignored);
+}
+
+}  // namespace test
+}  // namespace vorn
