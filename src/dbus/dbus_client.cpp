@@ -105,14 +105,15 @@ int DBusClient::ErrorNumber(const char* message) {
     if (*p == '\0') {
         return 1;
     }
-    long number = 0;
+    int number = 0;
     for (; std::isdigit(static_cast<unsigned char>(*p)); ++p) {
-        number = number * 10 + (*p - '0');
-        if (number > INT_MAX) {
+        const int digit = *p - '0';
+        if (number > (INT_MAX - digit) / 10) {
             return INT_MAX;
         }
+        number = number * 10 + digit;
     }
-    return static_cast<int>(number);
+    return number;
 }
 
 int DBusClient::SendMessage(bool waitReply, int timeoutMs) {

@@ -19,7 +19,7 @@ std::string OrEmpty(const gchar* text) {
 }  // namespace
 
 DBusServer::DBusServer(const char* name, const char* path, DBusBusType bus)
-    : bus_(bus), name_(name != nullptr ? name : ""), path_(path != nullptr ? path : "") {
+    : name_(name != nullptr ? name : ""), path_(path != nullptr ? path : "") {
     GError* error = nullptr;
     connection_ = g_bus_get_sync(ToGBusType(bus), nullptr, &error);
     if (connection_ == nullptr) {

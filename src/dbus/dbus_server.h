@@ -52,7 +52,6 @@ class DBusServer {
     std::atomic<GMainLoop*> loop_{nullptr};
     GDBusProxy* busProxy_ = nullptr;
     GDBusConnection* connection_ = nullptr;
-    DBusBusType bus_;
     std::string name_;
     std::string path_;
     std::string signal_;

@@ -8,6 +8,7 @@
 #include "dbus/net_client.h"
 #include "platform/root_path.h"
 #include "utils/json_text.h"
+#include "utils/log.h"
 
 namespace {
 
@@ -166,6 +167,14 @@ int main(int argc, char** argv) {
         }
     }
     vorn::platform::PrefixPathWithRoot();
+    // The library's failure lines (the service's error text among them) are the user's answer.
+    openlog("vornnetdtool", LOG_PID, LOG_USER);
+    vorn::log::SetSink([](int priority, const std::string& line) {
+        vorn::log::SyslogSink(priority, line);
+        if (priority <= LOG_WARNING) {
+            std::fprintf(stderr, "vornnetdtool: %s\n", line.c_str());
+        }
+    });
     if (words.size() == 1 && words[0] == "--ready") {
         const bool ready = NetClient().IsServerReady();
         std::printf("%s\n", ready ? "ready" : "not ready");

@@ -36,7 +36,7 @@ class EventTable {
     std::string ToStr() const;
 
   private:
-    const Handlers empty_;
+    const Handlers empty_{};
     Table table_;
 };
 

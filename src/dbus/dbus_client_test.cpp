@@ -1,0 +1,90 @@
+#include "dbus/dbus_client.h"
+
+#include <gmock/gmock.h>
+
+#include <climits>
+#include <cstdlib>
+
+#include "support/log_capture.h"
+
+namespace vornwireless {
+namespace dbus {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+
+TEST(DBusClientTest, ErrorNumberIsTheFirstRunOfDigitsOrOne) {
+    EXPECT_EQ(DBusClient::ErrorNumber("Failed to refresh adapter list (12)"), 12);
+    EXPECT_EQ(DBusClient::ErrorNumber("(12)"), 12);
+    EXPECT_EQ(DBusClient::ErrorNumber("Adapter is not found(wlan0)"), 0);
+    EXPECT_EQ(DBusClient::ErrorNumber("code 42 after 7"), 42);
+    EXPECT_EQ(DBusClient::ErrorNumber("failed to get gateway list data"), 1);
+    EXPECT_EQ(DBusClient::ErrorNumber(""), 1);
+    EXPECT_EQ(DBusClient::ErrorNumber(nullptr), 1);
+    EXPECT_EQ(DBusClient::ErrorNumber("x99999999999999999999999y"), INT_MAX);
+    EXPECT_EQ(DBusClient::ErrorNumber("2147483648"), INT_MAX);
+    EXPECT_EQ(DBusClient::ErrorNumber("2147483647"), INT_MAX);
+}
+
+// Every client here talks to a bus that is not there. GIO shares one session connection per
+// process while anyone holds it, so this holds only while no other test keeps a client alive.
+class DeadBusTest : public ::testing::Test {
+  protected:
+    DeadBusTest() {
+        const char* saved = std::getenv(kVariable);
+        hadAddress_ = saved != nullptr;
+        savedAddress_ = hadAddress_ ? saved : "";
+        setenv(kVariable, "unix:path=/nonexistent/vorn-test/bus", 1);
+    }
+    ~DeadBusTest() override {
+        if (hadAddress_) {
+            setenv(kVariable, savedAddress_.c_str(), 1);
+        } else {
+            unsetenv(kVariable);
+        }
+    }
+
+    static constexpr const char* kVariable = "DBUS_SESSION_BUS_ADDRESS";
+    vorn::test::LogCapture log_;
+    std::string savedAddress_;
+    bool hadAddress_ = false;
+};
+
+TEST_F(DeadBusTest, MisuseIsRefusedWithItsMessage) {
+    DBusClient client("com.tessarin.net", "/", "com.tessarin.net", DBUS_BUS_SESSION);
+    log_.Clear();
+
+    EXPECT_EQ(client.NewMessage(nullptr), -1);
+    EXPECT_THAT(log_.Lines(), ElementsAre(HasSubstr("Method name is null")));
+
+    log_.Clear();
+    EXPECT_EQ(client.Append("text"), -1);
+    EXPECT_EQ(client.Append(std::string("text")), -1);
+    EXPECT_EQ(client.Append(true), -1);
+    EXPECT_THAT(log_.Matching("Message is null"), ::testing::SizeIs(3));
+}
+
+TEST_F(DeadBusTest, UnreachableBusFailsEveryCall) {
+    DBusClient client("com.tessarin.net", "/", "com.tessarin.net", DBUS_BUS_SESSION);
+    EXPECT_THAT(log_.Lines(), ElementsAre(HasSubstr("Failed to get bus connection")));
+
+    log_.Clear();
+    EXPECT_EQ(client.NewMessage("GetGatewayListData"), -1);
+    EXPECT_THAT(log_.Lines(), IsEmpty());
+    EXPECT_EQ(client.Append("{}"), -1);
+    EXPECT_EQ(client.SendMessage(true, 1000), -1);
+    EXPECT_EQ(client.SendMessage(false, 1000), -1);
+    std::string text = "untouched";
+    std::vector<std::string> names{"untouched"};
+    EXPECT_EQ(client.GetReply(text), -1);
+    EXPECT_EQ(client.GetReply(names), -1);
+    EXPECT_EQ(text, "untouched");
+    EXPECT_THAT(names, ElementsAre("untouched"));
+    EXPECT_FALSE(client.IsServerReady());
+}
+
+}  // namespace
+}  // namespace dbus
+}  // namespace vornwireless

@@ -1,0 +1,325 @@
+// vornnetd as a process on a private session bus, over a fresh simulated root; needs no root.
+#include <gio/gio.h>
+#include <gmock/gmock.h>
+#include <signal.h>
+
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <map>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "dbus/net_client.h"
+#include "support/log_capture.h"
+#include "support/private_bus.h"
+#include "support/sim_root.h"
+
+namespace vorn {
+namespace test {
+namespace {
+
+using ::testing::HasSubstr;
+using Timeout = DaemonProcess::Timeout;
+
+constexpr char kVornnetd[] = VORN_BINARY_DIR "/daemons/vornnetd";
+constexpr char kTool[] = VORN_BINARY_DIR "/tools/vornnetdtool";
+constexpr char kService[] = "com.tessarin.net";
+constexpr char kRouteConfig[] = "/etc/iproute2/config";
+constexpr Timeout kStartTimeout{30000};
+constexpr Timeout kCallTimeout{20000};
+constexpr Timeout kExitTimeout{20000};
+
+// One method of the service, an argument it accepts, and the error it answers while its module
+// is missing.
+struct Method {
+    const char* name;
+    const char* in;
+    const char* out;  // "" for a method without result
+    bool json;        // the argument is a JSON object
+    const char* argument;
+    const char* error;
+};
+
+const Method kMethods[] = {
+    {"GetDeviceListData", "type", "data", false, "upnp", "failed to get upnp data"},
+    {"SetDeviceListData", "data", "", true, R"({"macAddr":"00:11:22:33:44:55","type":"nas"})",
+     "failed to set device type"},
+    {"DelDeviceListData", "mac", "", false, "00:11:22:33:44:55", "failed to set delete data"},
+    {"GetGatewayListData", "info", "data", true, R"({"type":"GTYPE_V4"})",
+     "failed to get gateway list data"},
+    {"AddGatewayData", "info", "", true,
+     R"({"type":"GTYPE_V4","ifname":"eth0","priority":0,"gateway":"10.0.0.1"})",
+     "failed to add gateway data"},
+    {"DelGatewayData", "info", "", true, R"({"type":"GTYPE_V4","ifname":"eth0"})",
+     "failed to del gateway data"},
+    {"GetGatewayDataByInterface", "info", "data", true, R"({"type":"GTYPE_V4","ifname":"eth0"})",
+     "failed to get gateway data by interface"},
+    {"SetSlaveData", "info", "", true, R"({"ifname":"eth0","slave":true})",
+     "failed to set slave data"},
+    {"CopyGatewayData", "info", "", true, R"({"type":"GTYPE_V4","src":"eth0","dst":"bond0"})",
+     "failed to copy gateway data"},
+    {"RefreshGateway", "type", "", true, R"({"type":"ALL"})", "failed to refresh gateway"},
+    {"ResetIPv6Module", "info", "", false, "eth0", "failed to reset ipv6 module"},
+};
+
+// The outcome of one call: the reply's text, or the error reply's name and its own message.
+struct Answer {
+    bool ok = false;
+    std::string text;
+    std::string errorName;
+};
+
+// One call through GIO, parameters being a floating GVariant tuple.
+Answer CallService(const char* method, GVariant* parameters) {
+    Answer answer;
+    GError* error = nullptr;
+    GDBusConnection* bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, &error);
+    GVariant* reply = bus == nullptr ? nullptr
+                                     : g_dbus_connection_call_sync(
+                                           bus, kService, "/", kService, method, parameters,
+                                           nullptr, G_DBUS_CALL_FLAGS_NONE,
+                                           static_cast<int>(kCallTimeout.count()), nullptr, &error);
+    if (bus == nullptr) {
+        g_variant_unref(g_variant_ref_sink(parameters));
+    } else {
+        g_object_unref(bus);
+    }
+    if (reply != nullptr) {
+        answer.ok = true;
+        if (g_variant_is_of_type(reply, G_VARIANT_TYPE("(s)"))) {
+            const char* text = nullptr;
+            g_variant_get(reply, "(&s)", &text);
+            answer.text = text;
+        }
+        g_variant_unref(reply);
+        return answer;
+    }
+    gchar* name = error != nullptr ? g_dbus_error_get_remote_error(error) : nullptr;
+    answer.errorName = name != nullptr ? name : "";
+    g_free(name);
+    if (error != nullptr) {
+        g_dbus_error_strip_remote_error(error);
+        answer.text = error->message;
+        g_error_free(error);
+    }
+    return answer;
+}
+
+Answer CallService(const char* method, const std::string& argument) {
+    return CallService(method, g_variant_new("(s)", argument.c_str()));
+}
+
+// One call through GLib's own command-line client, whose error line is
+// "Error: GDBus.Error:NAME: MESSAGE".
+Answer GdbusCall(const char* method, const std::string& argument) {
+    std::string out;
+    std::string err;
+    const int code = RunProgram({"gdbus", "call", "--session", "--dest", kService, "--object-path",
+                                 "/", "--method", std::string(kService) + "." + method, argument},
+                                kCallTimeout, &out, &err);
+    Answer answer;
+    answer.ok = code == 0;
+    const std::string prefix = "Error: GDBus.Error:";
+    const std::size_t nameEnd = err.find(": ", prefix.size());
+    if (code > 0 && err.compare(0, prefix.size(), prefix) == 0 && nameEnd != std::string::npos) {
+        answer.errorName = err.substr(prefix.size(), nameEnd - prefix.size());
+        answer.text = err.substr(nameEnd + 2, err.find('\n') - nameEnd - 2);
+    } else {
+        answer.text = code == 0 ? out : err;
+    }
+    return answer;
+}
+
+// Every file below a logical folder of the root, with its content.
+std::map<std::string, std::string> Snapshot(const SimRoot& root, const std::string& logical) {
+    std::map<std::string, std::string> files;
+    for (const auto& entry : std::filesystem::recursive_directory_iterator(root.Path(logical))) {
+        std::ostringstream content;
+        if (entry.is_regular_file()) {
+            content << std::ifstream(entry.path(), std::ios::binary).rdbuf();
+        }
+        files[entry.path().string()] = entry.is_regular_file() ? content.str() : "(folder)";
+    }
+    return files;
+}
+
+// A JSON object nested depth levels deep.
+std::string DeepObject(int depth) {
+    std::string text;
+    for (int i = 0; i < depth; ++i) {
+        text += R"({"a":)";
+    }
+    text += "1";
+    return text + std::string(depth, '}');
+}
+
+class VornnetdTest : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        ASSERT_TRUE(bus_.Started());
+        ASSERT_TRUE(daemon_.WaitForBusName(kService, kStartTimeout)) << daemon_.Stderr();
+    }
+
+    // The daemon is up and serving: a call gets its module's answer.
+    void ExpectServing() {
+        const Answer answer = CallService("GetGatewayListData", R"({"type":"GTYPE_V4"})");
+        EXPECT_EQ(answer.text, "failed to get gateway list data");
+        EXPECT_TRUE(daemon_.Running()) << daemon_.Stderr();
+    }
+
+    LogCapture log_;
+    PrivateBus bus_;
+    SimRoot root_;
+    DaemonProcess daemon_{{kVornnetd, "--foreground"}};
+};
+
+TEST_F(VornnetdTest, ServesEveryMethodToBothClients) {
+    vornnetwork::dbus::NetClient client;
+    EXPECT_TRUE(client.IsServerReady());
+    Json::Value info;
+    info["type"] = "GTYPE_V4";
+    Json::Value data;
+    EXPECT_EQ(client.GetGatewayListData(info, data), -1);
+    EXPECT_TRUE(log_.Contains("Failed to send message: failed to get gateway list data (-1)"));
+    EXPECT_EQ(client.GetDeviceListData("upnp", data), -1);
+    EXPECT_EQ(client.DelDeviceListData("00:11:22:33:44:55"), -1);
+    // The error number is read from the text: the 6 of "ipv6".
+    EXPECT_EQ(client.ResetIPv6Module("eth0"), -6);
+
+    for (const Method& method : kMethods) {
+        const Answer answer = GdbusCall(method.name, method.argument);
+        EXPECT_FALSE(answer.ok) << method.name;
+        EXPECT_EQ(answer.text, method.error) << method.name;
+    }
+
+    std::string xml;
+    ASSERT_EQ(RunProgram({"gdbus", "introspect", "--session", "--dest", kService, "--object-path",
+                          "/", "--xml"},
+                         kCallTimeout, &xml),
+              0);
+    GDBusNodeInfo* node = g_dbus_node_info_new_for_xml(xml.c_str(), nullptr);
+    ASSERT_NE(node, nullptr) << xml;
+    const GDBusInterfaceInfo* interface = g_dbus_node_info_lookup_interface(node, kService);
+    ASSERT_NE(interface, nullptr) << xml;
+    std::size_t count = 0;
+    while (interface->methods[count] != nullptr) {
+        ++count;
+    }
+    EXPECT_EQ(count, std::size(kMethods));
+    for (const Method& method : kMethods) {
+        const GDBusMethodInfo* found = g_dbus_interface_info_lookup_method(
+            const_cast<GDBusInterfaceInfo*>(interface), method.name);
+        ASSERT_NE(found, nullptr) << method.name;
+        ASSERT_NE(found->in_args[0], nullptr) << method.name;
+        EXPECT_STREQ(found->in_args[0]->name, method.in) << method.name;
+        EXPECT_STREQ(found->in_args[0]->signature, "s") << method.name;
+        EXPECT_EQ(found->in_args[1], nullptr) << method.name;
+        const std::string out = found->out_args[0] != nullptr ? found->out_args[0]->name : "";
+        EXPECT_EQ(out, method.out) << method.name;
+        if (found->out_args[0] != nullptr) {
+            EXPECT_STREQ(found->out_args[0]->signature, "s") << method.name;
+            EXPECT_EQ(found->out_args[1], nullptr) << method.name;
+        }
+    }
+    g_dbus_node_info_unref(node);
+}
+
+TEST_F(VornnetdTest, BadInputGetsAnErrorAndChangesNothing) {
+    const auto before = Snapshot(root_, kRouteConfig);
+    const std::string huge = R"({"ifname":")" + std::string(3 << 20, 'x') + R"("})";
+    const std::string deep = DeepObject(10000);
+
+    const std::vector<std::string> unparsable = {"not json", R"({"type":)", "",   "[1]", R"("x")",
+                                                 "7",        "null",        deep, huge};
+    for (const std::string& input : unparsable) {
+        for (const Method& method : kMethods) {
+            const Answer answer = CallService(method.name, input);
+            EXPECT_FALSE(answer.ok) << method.name << " " << input.substr(0, 40);
+            const std::string expected = method.json
+                                             ? std::string("Method invoked for ") + method.name +
+                                                   " returned FALSE but did not set error"
+                                             : method.error;
+            EXPECT_EQ(answer.text, expected) << method.name << " " << input.substr(0, 40);
+        }
+        ExpectServing();
+    }
+
+    // Well-formed objects whose keys have the wrong types are the module's to refuse.
+    const std::string wrongTypes =
+        R"({"type":7,"ifname":["eth0"],"priority":"high","gateway":{},"method":false})";
+    for (const Method& method : kMethods) {
+        EXPECT_EQ(CallService(method.name, wrongTypes).text, method.error) << method.name;
+    }
+
+    EXPECT_EQ(CallService("AddGatewayData", g_variant_new("(i)", 7)).errorName,
+              "org.freedesktop.DBus.Error.InvalidArgs");
+    EXPECT_EQ(CallService("AddGatewayData", g_variant_new("(ss)", "{}", "{}")).errorName,
+              "org.freedesktop.DBus.Error.InvalidArgs");
+    EXPECT_EQ(CallService("NoSuchMethod", std::string("{}")).errorName,
+              "org.freedesktop.DBus.Error.UnknownMethod");
+    ExpectServing();
+    EXPECT_EQ(Snapshot(root_, kRouteConfig), before);
+}
+
+TEST_F(VornnetdTest, RefusesToStartWithoutItsPidFileOrItsBus) {
+    DaemonProcess second({kVornnetd, "--foreground"});
+    const int code = second.WaitForExit(kExitTimeout);
+    EXPECT_GT(code, 0);
+    EXPECT_LT(code, 128) << "crashed";
+    EXPECT_THAT(second.Stderr(), HasSubstr("cannot take /var/run/vornnetd.pid: another vornnetd "
+                                           "is running"));
+    EXPECT_EQ(root_.ReadFile("/var/run/vornnetd.pid"), std::to_string(daemon_.Pid()) + "\n");
+    ExpectServing();
+
+    SimRoot otherRoot;
+    const std::string address = bus_.Address();
+    setenv("DBUS_SESSION_BUS_ADDRESS", "unix:path=/nonexistent/vorn-test/bus", 1);
+    DaemonProcess busless({kVornnetd, "--foreground"});
+    setenv("DBUS_SESSION_BUS_ADDRESS", address.c_str(), 1);
+    const int buslessCode = busless.WaitForExit(kExitTimeout);
+    EXPECT_GT(buslessCode, 0);
+    EXPECT_LT(buslessCode, 128) << "crashed";
+    EXPECT_THAT(busless.Stderr(), HasSubstr("cannot serve com.tessarin.net on the session bus"));
+    EXPECT_FALSE(otherRoot.Exists("/var/run/vornnetd.pid"));
+}
+
+TEST_F(VornnetdTest, SigtermStopsTheLoopAndReleasesTheName) {
+    ASSERT_TRUE(daemon_.Signal(SIGTERM));
+    EXPECT_EQ(daemon_.WaitForExit(kExitTimeout), 0) << daemon_.Stderr();
+    const std::string err = daemon_.Stderr();
+    EXPECT_THAT(err, HasSubstr("Stopping on signal"));
+    EXPECT_THAT(err, HasSubstr("Stopped"));
+    EXPECT_FALSE(root_.Exists("/var/run/vornnetd.pid"));
+
+    const vornwireless::dbus::DBusClient probe(kService, "/", kService,
+                                               vornwireless::dbus::DBUS_BUS_SESSION);
+    EXPECT_FALSE(probe.IsServerReady());
+    std::string out;
+    EXPECT_EQ(RunProgram({kTool, "--ready"}, kCallTimeout, &out), 1);
+    EXPECT_EQ(out, "not ready\n");
+}
+
+TEST_F(VornnetdTest, ToolAnswersThroughItsExitStatus) {
+    std::string out;
+    std::string err;
+    EXPECT_EQ(RunProgram({kTool, "--help"}, kCallTimeout, &out), 0);
+    EXPECT_THAT(out, HasSubstr("Usage: vornnetdtool"));
+
+    EXPECT_EQ(RunProgram({kTool, "--frobnicate", "x"}, kCallTimeout, &out, &err), 2);
+    EXPECT_THAT(err, HasSubstr("unknown command"));
+    EXPECT_EQ(RunProgram({kTool, "--add-gateway", "not json"}, kCallTimeout, &out, &err), 2);
+    EXPECT_THAT(err, HasSubstr("'not json' is not a JSON object"));
+
+    EXPECT_EQ(RunProgram({kTool, "--get-gateway-list", "v4"}, kCallTimeout, &out, &err), 1);
+    EXPECT_EQ(out, "");
+    EXPECT_THAT(err, HasSubstr("--get-gateway-list failed (-1)"));
+
+    EXPECT_EQ(RunProgram({kTool, "--ready"}, kCallTimeout, &out), 0);
+    EXPECT_EQ(out, "ready\n");
+}
+
+}  // namespace
+}  // namespace test
+}  // namespace vorn
