@@ -16,54 +16,19 @@
 
 #include "platform/qlibc_error.h"
 #include "platform/root_path.h"
+#include "platform/spawn_setup.h"
 
 extern char** environ;
 
 namespace {
 
+using vorn::platform::SpawnActions;
+using vorn::platform::SpawnAttributes;
+
 int Fail(int code) {
     QLIBCErrSet(code);
     return -1;
 }
-
-class SpawnActions {
-  public:
-    SpawnActions() { posix_spawn_file_actions_init(&actions_); }
-    ~SpawnActions() { posix_spawn_file_actions_destroy(&actions_); }
-    SpawnActions(const SpawnActions&) = delete;
-    SpawnActions& operator=(const SpawnActions&) = delete;
-
-    void Silence(int fd, int openFlags) {
-        posix_spawn_file_actions_addopen(&actions_, fd, "/dev/null", openFlags, 0);
-    }
-    const posix_spawn_file_actions_t* Get() const { return &actions_; }
-
-  private:
-    posix_spawn_file_actions_t actions_;
-};
-
-// The child starts with default signal handling and nothing blocked, whatever the daemon's
-// threads have set up for themselves.
-class SpawnAttributes {
-  public:
-    SpawnAttributes() {
-        posix_spawnattr_init(&attr_);
-        sigset_t none;
-        sigset_t all;
-        sigemptyset(&none);
-        sigfillset(&all);
-        posix_spawnattr_setsigmask(&attr_, &none);
-        posix_spawnattr_setsigdefault(&attr_, &all);
-        posix_spawnattr_setflags(&attr_, POSIX_SPAWN_SETSIGMASK | POSIX_SPAWN_SETSIGDEF);
-    }
-    ~SpawnAttributes() { posix_spawnattr_destroy(&attr_); }
-    SpawnAttributes(const SpawnAttributes&) = delete;
-    SpawnAttributes& operator=(const SpawnAttributes&) = delete;
-    const posix_spawnattr_t* Get() const { return &attr_; }
-
-  private:
-    posix_spawnattr_t attr_;
-};
 
 int WaitForExit(pid_t pid) {
     int status = 0;

@@ -42,5 +42,40 @@ int QLIBCExec_S(const char* prog, const char* a1, const char* a2, const char* a3
     return QLIBCExec(prog, a1, a2, a3, a4);
 }
 
+int QLIBNetIfLinkDownEvent_S(const char* ifname) {
+    Serialised guard("QLIBNetIfLinkDownEvent");
+    return QLIBNetIfLinkDownEvent(ifname);
+}
+
+int QLIBNetIfLinkUpEvent_S(const char* ifname) {
+    Serialised guard("QLIBNetIfLinkUpEvent");
+    return QLIBNetIfLinkUpEvent(ifname);
+}
+
+int QLIBPluginAction_S(int action, QLIBPLUGIN* handle) {
+    Serialised guard("QLIBPluginAction");
+    return QLIBPluginAction(action, handle);
+}
+
+int NetRoutetableHandler_S(int action, const char* ifname) {
+    Serialised guard("NetRoutetableHandler");
+    return NetRoutetableHandler(action, ifname);
+}
+
+int VORNNetIFGetInfo_S(const char* ifname, int flags, VORN_NET_IF_CONFIG* info) {
+    Serialised guard("VORNNetIFGetInfo");
+    return VORNNetIFGetInfo(ifname, flags, info);
+}
+
+int BlVORNLnxIsDHCP_S(const char* ifname) {
+    Serialised guard("BlVORNLnxIsDHCP");
+    return BlVORNLnxIsDHCP(ifname);
+}
+
+int VORNNetSetCard1_S(const VORN_NET_IF_CONFIG* info, int flags) {
+    Serialised guard("VORNNetSetCard1");
+    return VORNNetSetCard1(info, flags);
+}
+
 }  // namespace sdk_s
 }  // namespace vornwireless

@@ -15,7 +15,7 @@ namespace test {
 // lives, VORN_ROOT points at it and PATH starts with its program folders; both are restored and
 // the directory removed afterwards.
 class SimRoot {
-public:
+  public:
     enum class Kind { kSimulated, kLive };
     explicit SimRoot(Kind kind = Kind::kSimulated);
     ~SimRoot();
@@ -39,7 +39,7 @@ public:
     std::vector<std::string> Calls() const;
     void ClearCalls() const;
 
-private:
+  private:
     std::string dir_;
     std::string savedRoot_;
     std::string savedPath_;
@@ -49,7 +49,7 @@ private:
 
 // Base fixture of unit tests: a fresh simulated root and captured log lines for every test.
 class RootTest : public ::testing::Test {
-protected:
+  protected:
     LogCapture log_;
     SimRoot root_;
 };

@@ -1,0 +1,361 @@
+#include "platform/vorn_net.h"
+
+#include <arpa/inet.h>
+#include <fcntl.h>
+#include <strings.h>
+#include <unistd.h>
+
+#include <cstdarg>
+#include <cstdio>
+#include <cstring>
+#include <ctime>
+#include <exception>
+#include <memory>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "platform/qlibc_container.h"
+#include "platform/qlibc_error.h"
+#include "platform/qlibc_file.h"
+#include "platform/qlibc_proc.h"
+#include "platform/root_path.h"
+#include "utils/interface_name.h"
+
+namespace {
+
+using vornwireless::utils::IsValidInterfaceName;
+
+const char kIfcfgPrefix[] = "/etc/sysconfig/network-scripts/ifcfg-";
+const char kNetworkFile[] = "/etc/sysconfig/network";
+const char kEventLog[] = "/var/log/vorn_event.log";
+const char kIp[] = "/sbin/ip";
+constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
+// Bounds on what is read of a routing table and written per event.
+constexpr size_t kMaxRouteLines = 1024;
+constexpr size_t kMaxRouteLineLength = 1024;
+constexpr int kMaxEventTexts = 16;
+constexpr size_t kMaxEventTextLength = 256;
+
+struct HashDeleter {
+    void operator()(QLIBSZHASH* hash) const { QLIBCSzHashFree(hash); }
+};
+struct ListDeleter {
+    void operator()(QLIBSZLIST* list) const { QLIBCSzListFree(list); }
+};
+using Hash = std::unique_ptr<QLIBSZHASH, HashDeleter>;
+using List = std::unique_ptr<QLIBSZLIST, ListDeleter>;
+
+int Fail(int code) {
+    QLIBCErrSet(code);
+    return -1;
+}
+
+std::string IfcfgPath(const std::string& ifname) {
+    return kIfcfgPrefix + ifname;
+}
+
+bool IsIPv4(const std::string& text) {
+    in_addr parsed;
+    return inet_pton(AF_INET, text.c_str(), &parsed) == 1;
+}
+
+// A fixed text field of a record: NUL-terminated within its size.
+bool FieldText(const char* field, size_t size, std::string& text) {
+    const size_t length = strnlen(field, size);
+    if (length == size) {
+        return false;
+    }
+    text.assign(field, length);
+    return true;
+}
+
+bool CopyToField(char* field, size_t size, const std::string& text) {
+    if (text.size() >= size) {
+        return false;
+    }
+    std::memcpy(field, text.c_str(), text.size() + 1);
+    return true;
+}
+
+int CopyResult(char* buffer, int size, const std::string& text) {
+    return CopyToField(buffer, static_cast<size_t>(size), text) ? 0 : Fail(QLIBC_ERR_FORMAT);
+}
+
+bool IsDhcpValue(const char* bootproto) {
+    return bootproto != nullptr && strcasecmp(bootproto, "dhcp") == 0;
+}
+
+// Reads the listed keys of a key=value file; null when the file cannot be read.
+Hash ReadKeys(const std::string& file, std::initializer_list<const char*> keys) {
+    List filter(QLIBCSzListAlloc(static_cast<int>(keys.size())));
+    if (filter == nullptr) {
+        return nullptr;
+    }
+    for (const char* key : keys) {
+        QLIBCSzListAdd(filter.get(), key);
+    }
+    QLIBSZHASH* hash = nullptr;
+    if (QLIBCFileGetKeys(file.c_str(), filter.get(), &hash, "=") < 0) {
+        QLIBCSzHashFree(hash);
+        return nullptr;
+    }
+    return Hash(hash != nullptr ? hash : QLIBCSzHashAlloc(1));
+}
+
+// An IPv4 value of an ifcfg record: absent is "", anything else must be a dotted quad that fits.
+bool ReadAddressKey(const QLIBSZHASH* hash, const char* key, char* field, size_t size) {
+    const char* value = QLIBCSzHashGetValue(hash, key);
+    if (value == nullptr || value[0] == '\0') {
+        return true;
+    }
+    return IsIPv4(value) && CopyToField(field, size, value);
+}
+
+// Lines of a command's output, each whole line at most kMaxRouteLineLength bytes; longer lines
+// are dropped rather than split. False when it could not run or did not exit with 0.
+bool ReadCommandLines(const std::string& commandLine, std::vector<std::string>& lines) {
+    FILE* pipe = popen(vorn::platform::RootShellCommand(commandLine).c_str(), "re");
+    if (pipe == nullptr) {
+        return false;
+    }
+    std::vector<char> buffer(kMaxRouteLineLength + 2);
+    bool partial = false;
+    while (lines.size() < kMaxRouteLines &&
+           std::fgets(buffer.data(), static_cast<int>(buffer.size()), pipe) != nullptr) {
+        const std::string piece = buffer.data();
+        const bool ended = !piece.empty() && piece.back() == '\n';
+        if (!partial && ended) {
+            lines.push_back(piece.substr(0, piece.size() - 1));
+        }
+        partial = !ended;
+    }
+    // Stopping at the bound may end the program by a broken pipe: that is not its failure.
+    const bool bounded = lines.size() >= kMaxRouteLines;
+    return pclose(pipe) == 0 || bounded;
+}
+
+// The gateway of the first "default via GW ..." line; "" when there is none.
+std::string DefaultGateway(const std::vector<std::string>& routes) {
+    for (const std::string& route : routes) {
+        std::istringstream words(route);
+        std::string first;
+        std::string second;
+        std::string gateway;
+        if (words >> first >> second >> gateway && first == "default" && second == "via") {
+            return IsIPv4(gateway) ? gateway : "";
+        }
+    }
+    return "";
+}
+
+std::string EventTime() {
+    const std::time_t now = std::time(nullptr);
+    std::tm local{};
+    char text[32] = {};
+    if (localtime_r(&now, &local) != nullptr) {
+        std::strftime(text, sizeof(text), "%Y-%m-%d %H:%M:%S", &local);
+    }
+    return text;
+}
+
+// One field of an event line: tabs and line ends would break the line apart.
+std::string EventText(const char* text) {
+    std::string field(text, strnlen(text, kMaxEventTextLength));
+    for (char& c : field) {
+        if (c == '\t' || c == '\n' || c == '\r') {
+            c = ' ';
+        }
+    }
+    return field;
+}
+
+bool AppendLine(const std::string& path, const std::string& line) {
+    const int fd = open(vorn::platform::RootPath(path).c_str(),
+                        O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0644);
+    if (fd < 0) {
+        return false;
+    }
+    // One write, so lines of concurrent writers do not interleave.
+    const ssize_t written = write(fd, line.data(), line.size());
+    close(fd);
+    return written == static_cast<ssize_t>(line.size());
+}
+
+}  // namespace
+
+extern "C" {
+
+int BlVORNLnxIsDHCP(const char* ifname) {
+    if (ifname == nullptr || !IsValidInterfaceName(ifname)) {
+        QLIBCErrSet(QLIBC_ERR_INVALID_ARG);
+        return 0;
+    }
+    return QLIBCFileCheckKeyValue(IfcfgPath(ifname).c_str(), "BOOTPROTO", "dhcp",
+                                  QLIBC_FILE_IGNORE_CASE) == 1
+               ? 1
+               : 0;
+}
+
+int VORNNetIFGetInfo(const char* ifname, int flags, VORN_NET_IF_CONFIG* info) {
+    (void)flags;
+    if (ifname == nullptr || info == nullptr || !IsValidInterfaceName(ifname)) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    try {
+        const Hash keys =
+            ReadKeys(IfcfgPath(ifname), {"DEVICE", "BOOTPROTO", "IPADDR", "NETMASK", "GATEWAY"});
+        if (keys == nullptr) {
+            return -1;
+        }
+        VORN_NET_IF_CONFIG record;
+        std::memset(&record, 0, sizeof(record));
+        const char* device = QLIBCSzHashGetValue(keys.get(), "DEVICE");
+        const std::string name = device != nullptr ? device : ifname;
+        record.dhcp = IsDhcpValue(QLIBCSzHashGetValue(keys.get(), "BOOTPROTO")) ? 1 : 0;
+        if (!IsValidInterfaceName(name) || !CopyToField(record.name, sizeof(record.name), name) ||
+            !ReadAddressKey(keys.get(), "IPADDR", record.ipv4, sizeof(record.ipv4)) ||
+            !ReadAddressKey(keys.get(), "NETMASK", record.netmask, sizeof(record.netmask)) ||
+            !ReadAddressKey(keys.get(), "GATEWAY", record.gateway, sizeof(record.gateway))) {
+            return Fail(QLIBC_ERR_FORMAT);
+        }
+        *info = record;
+        return 0;
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+int VORNNetSetCard1(const VORN_NET_IF_CONFIG* info, int flags) {
+    (void)flags;
+    if (info == nullptr) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    try {
+        std::string name;
+        std::string address[3];
+        if (!FieldText(info->name, sizeof(info->name), name) || !IsValidInterfaceName(name) ||
+            !FieldText(info->ipv4, sizeof(info->ipv4), address[0]) ||
+            !FieldText(info->netmask, sizeof(info->netmask), address[1]) ||
+            !FieldText(info->gateway, sizeof(info->gateway), address[2])) {
+            return Fail(QLIBC_ERR_INVALID_ARG);
+        }
+        const Hash set(QLIBCSzHashAlloc(6));
+        const Hash remove(QLIBCSzHashAlloc(3));
+        if (set == nullptr || remove == nullptr) {
+            return Fail(QLIBC_ERR_NO_MEMORY);
+        }
+        QLIBCSzHashSetValue(set.get(), "DEVICE", name.c_str());
+        // An equivalent BOOTPROTO ("none" against "static") is left as the file has it.
+        if (BlVORNLnxIsDHCP(name.c_str()) != info->dhcp) {
+            QLIBCSzHashSetValue(set.get(), "BOOTPROTO", info->dhcp ? "dhcp" : "static");
+        }
+        const char* const keys[] = {"IPADDR", "NETMASK", "GATEWAY"};
+        for (int i = 0; i < 3; ++i) {
+            if (address[i].empty()) {
+                QLIBCSzHashSetValue(remove.get(), keys[i], "");
+            } else if (IsIPv4(address[i])) {
+                QLIBCSzHashSetValue(set.get(), keys[i], address[i].c_str());
+            } else {
+                return Fail(QLIBC_ERR_INVALID_ARG);
+            }
+        }
+        if (QLIBCFileSetKeys(IfcfgPath(name).c_str(), set.get(), remove.get(), 0) != 0) {
+            return -1;
+        }
+        return QLIBCExecl("/etc/rc.network", kExecFlags, "restart-if", name.c_str(), nullptr);
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+int VORNNetDefaultGatewayGet(char* buffer, int size) {
+    if (buffer == nullptr || size <= 0) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    try {
+        std::vector<std::string> routes;
+        if (!ReadCommandLines(std::string(kIp) + " -4 route show table main", routes)) {
+            return Fail(QLIBC_ERR_EXEC);
+        }
+        return CopyResult(buffer, size, DefaultGateway(routes));
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+int VORNNetDefaultGatewaySet(const char* gateway) {
+    if (gateway == nullptr || gateway[0] == '\0') {
+        char current[20] = {};
+        if (VORNNetDefaultGatewayGet(current, sizeof(current)) != 0) {
+            return -1;
+        }
+        if (current[0] == '\0') {
+            return 0;
+        }
+        return QLIBCExecl(kIp, kExecFlags, "-4", "route", "del", "default", nullptr);
+    }
+    if (!IsIPv4(gateway)) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    return QLIBCExecl(kIp, kExecFlags, "-4", "route", "replace", "default", "via", gateway,
+                      nullptr);
+}
+
+int VORNNetDefaultGatewayGetConf(char* buffer, int size) {
+    if (buffer == nullptr || size <= 0) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    buffer[0] = '\0';
+    if (QLIBCFileExist(kNetworkFile) != 1) {
+        return 0;
+    }
+    char value[64] = {};
+    if (QLIBCFileGetKeyValue(kNetworkFile, "GATEWAY", value, sizeof(value), 0) < 0) {
+        return -1;
+    }
+    if (value[0] != '\0' && !IsIPv4(value)) {
+        return Fail(QLIBC_ERR_FORMAT);
+    }
+    return CopyResult(buffer, size, value);
+}
+
+int VORNNetDefaultGatewaySetConf(const char* gateway) {
+    const bool unset = gateway == nullptr || gateway[0] == '\0';
+    if (!unset && !IsIPv4(gateway)) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    const Hash change(QLIBCSzHashAlloc(1));
+    if (change == nullptr ||
+        QLIBCSzHashSetValue(change.get(), "GATEWAY", unset ? "" : gateway) != 0) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+    return QLIBCFileSetKeys(kNetworkFile, unset ? nullptr : change.get(),
+                            unset ? change.get() : nullptr, 0);
+}
+
+int VORNLogSet1(int level, int category, unsigned int code, ...) {
+    const char* texts[kMaxEventTexts] = {};
+    va_list list;
+    va_start(list, code);
+    for (int i = 0; i < kMaxEventTexts; ++i) {
+        texts[i] = va_arg(list, const char*);
+        if (texts[i] == nullptr) {
+            break;
+        }
+    }
+    va_end(list);
+    try {
+        char head[64];
+        std::snprintf(head, sizeof(head), "\t%d\t%d\t0x%08X", level, category, code);
+        std::string line = EventTime() + head;
+        for (int i = 0; i < kMaxEventTexts && texts[i] != nullptr; ++i) {
+            line += "\t" + EventText(texts[i]);
+        }
+        return AppendLine(kEventLog, line + "\n") ? 0 : Fail(QLIBC_ERR_FILE_IO);
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+}  // extern "C"
