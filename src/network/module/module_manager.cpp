@@ -1,5 +1,6 @@
 #include "network/module/module_manager.h"
 
+#include "network/module/netlink_module.h"
 #include "network/module/test_module.h"
 #include "utils/log.h"
 
@@ -16,7 +17,7 @@ BaseModule* NotBuiltYet() {
 }  // namespace
 
 const ModuleManager::MODULE_INFO ModuleManager::module_info[5] = {
-    {MODULE_TEST, false, &TestModule::Create}, {MODULE_NETLINK, true, &NotBuiltYet},
+    {MODULE_TEST, false, &TestModule::Create}, {MODULE_NETLINK, true, &NetlinkModule::Create},
     {MODULE_IPV6, true, &NotBuiltYet},         {MODULE_ROUTE, true, &NotBuiltYet},
     {MODULE_DEVICE_LIST, true, &NotBuiltYet},
 };

@@ -1,0 +1,370 @@
+#include "network/module/netlink_module.h"
+
+#include <arpa/inet.h>
+#include <gmock/gmock.h>
+#include <linux/rtnetlink.h>
+#include <net/if.h>
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <cstring>
+#include <sstream>
+#include <vector>
+
+#include "support/sim_root.h"
+
+namespace vornnetwork {
+namespace network {
+namespace module {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::UnorderedElementsAre;
+
+constexpr unsigned int kUp = IFF_UP;
+constexpr unsigned int kRunning = IFF_UP | IFF_RUNNING | 0x10000;  // with IFF_LOWER_UP
+
+// rtnetlink messages laid out as the kernel does; the length setters forge malformed ones.
+class Messages {
+  public:
+    template <typename Fixed>
+    Messages& Add(std::uint16_t type, const Fixed& fixed) {
+        start_ = bytes_.size();
+        nlmsghdr header{};
+        header.nlmsg_type = type;
+        Append(&header, sizeof(header));
+        Append(&fixed, sizeof(fixed));
+        return *this;
+    }
+    Messages& Attr(std::uint16_t type, const void* data, std::size_t size) {
+        attribute_ = bytes_.size();
+        rtattr header{};
+        header.rta_type = type;
+        header.rta_len = static_cast<std::uint16_t>(RTA_LENGTH(size));
+        Append(&header, sizeof(header));
+        Append(data, size);
+        return *this;
+    }
+    Messages& Text(std::uint16_t type, const std::string& text) {
+        return Attr(type, text.c_str(), text.size() + 1);
+    }
+    Messages& Address(std::uint16_t type, int family, const char* text) {
+        unsigned char bytes[16] = {};
+        EXPECT_EQ(inet_pton(family, text, bytes), 1) << text;
+        return Attr(type, bytes, family == AF_INET ? 4 : 16);
+    }
+    Messages& U32(std::uint16_t type, std::uint32_t value) { return Attr(type, &value, 4); }
+    Messages& MessageLength(std::uint32_t length) {
+        std::memcpy(&bytes_[start_], &length, sizeof(length));
+        return *this;
+    }
+    Messages& AttrLength(std::uint16_t length) {
+        std::memcpy(&bytes_[attribute_], &length, sizeof(length));
+        return *this;
+    }
+    // Hands the messages to the module as one read of the given size (default: all of it).
+    void To(NetlinkModule& module, std::size_t size = 0) {
+        std::vector<std::uint32_t> aligned(bytes_.size() / 4 + 1);
+        std::memcpy(aligned.data(), bytes_.data(), bytes_.size());
+        module.DispatchMessages(aligned.data(), size != 0 ? size : bytes_.size());
+    }
+
+  private:
+    void Append(const void* data, std::size_t size) {
+        const unsigned char* begin = static_cast<const unsigned char*>(data);
+        bytes_.insert(bytes_.end(), begin, begin + size);
+        bytes_.resize(NLMSG_ALIGN(bytes_.size()), 0);
+        const std::uint32_t length = static_cast<std::uint32_t>(bytes_.size() - start_);
+        std::memcpy(&bytes_[start_], &length, sizeof(length));
+    }
+
+    std::vector<unsigned char> bytes_;
+    std::size_t start_ = 0;
+    std::size_t attribute_ = 0;
+};
+
+Messages& Link(Messages& messages, const std::string& name, unsigned int flags) {
+    ifinfomsg info{};
+    info.ifi_flags = flags;
+    return messages.Add(RTM_NEWLINK, info).Text(IFLA_IFNAME, name);
+}
+
+Messages& IPv4(Messages& messages, std::uint16_t type, const std::string& label,
+               const char* address) {
+    ifaddrmsg info{};
+    info.ifa_family = AF_INET;
+    info.ifa_prefixlen = 24;
+    info.ifa_index = 1;
+    return messages.Add(type, info)
+        .Address(IFA_ADDRESS, AF_INET, address)
+        .Address(IFA_LOCAL, AF_INET, address)
+        .Text(IFA_LABEL, label);
+}
+
+// IPv6 notices carry no label: the name comes from the index, 1 being lo everywhere.
+Messages& IPv6(Messages& messages, std::uint16_t type, const char* address,
+               std::uint32_t index = 1) {
+    ifaddrmsg info{};
+    info.ifa_family = AF_INET6;
+    info.ifa_prefixlen = 64;
+    info.ifa_index = index;
+    return messages.Add(type, info).Address(IFA_ADDRESS, AF_INET6, address);
+}
+
+Messages& Route(Messages& messages, std::uint16_t type, unsigned char table) {
+    rtmsg info{};
+    info.rtm_family = AF_INET;
+    info.rtm_table = table;
+    return messages.Add(type, info);
+}
+
+const char kEth0Addresses[] =
+    "print 2: eth0    inet 10.0.0.2/24 brd 10.0.0.255 scope global eth0\\       valid_lft "
+    "forever preferred_lft forever\n"
+    "print 2: eth0    inet 10.0.0.4/24 brd 10.0.0.255 scope global secondary eth0\\       "
+    "valid_lft forever preferred_lft forever\n";
+
+class NetlinkModuleTest : public vorn::test::RootTest {
+  protected:
+    NetlinkModuleTest() : module_([this] { return now_; }) {
+        for (const char* point : {"ipv4_change", "ipv6_change"}) {
+            Record(point, "$IFNAME|$ORIGIN_ADDRESS|$NEW_ADDRESS|$PREFIX_LENGTH");
+        }
+        Record("gateway_change", "$ACTION|$IFNAME|$DESTINATION|$GATEWAY");
+        root_.Scenario("ip", std::string("when -4 -o addr show dev eth0\n") + kEth0Addresses +
+                                 "when -4 -o addr show\n" + kEth0Addresses);
+    }
+
+    // A hook script that appends its variables to /tmp/<point>.
+    void Record(const std::string& point, const std::string& variables) {
+        const std::string script = "/etc/vorn/plugins/net/" + point + ".d/record";
+        root_.WriteFile(script, "#!/bin/sh\necho \"" + variables + "\" >>" +
+                                    root_.Path("/tmp/" + point) + "\n");
+        chmod(root_.Path(script).c_str(), 0755);
+    }
+    std::vector<std::string> Runs(const std::string& point) const {
+        std::istringstream text(root_.ReadFile("/tmp/" + point));
+        std::vector<std::string> lines;
+        for (std::string line; std::getline(text, line);) {
+            lines.push_back(line);
+        }
+        return lines;
+    }
+    std::vector<std::string> Handlers() const {
+        std::vector<std::string> calls;
+        for (const std::string& call : root_.Calls()) {
+            if (call.rfind("/etc/rc.network ", 0) == 0) {
+                calls.push_back(call.substr(16));
+            }
+        }
+        return calls;
+    }
+    void Reseed() {
+        module_.OnReadFailure(ENOBUFS);
+        module_.ReseedIfDue();
+    }
+
+    NetlinkModule::Clock::time_point now_{};
+    NetlinkModule module_;
+};
+
+TEST_F(NetlinkModuleTest, LinkNoticesCallThePlatformOnRealChangesOnly) {
+    ASSERT_EQ(module_.InitInterface(), 0);
+    Messages messages;
+    Link(messages, "eth0", kRunning);                       // as seeded
+    Link(messages, "eth0", kUp);                            // down
+    Link(messages, "eth0", kUp);                            // repeated
+    Link(messages, "eth0", IFF_UP | IFF_RUNNING);           // lower layer down: ignored
+    Link(messages, "eth7", kUp);                            // never seen: acts
+    Link(messages, "bond0s", kRunning | IFF_SLAVE);         // a bond member
+    Link(messages, "bond0s", kRunning);                     // its state was recorded
+    Link(messages, "port0", kRunning).U32(IFLA_MASTER, 9);  // a bridge port
+    Link(messages, "port0", kUp).U32(IFLA_MASTER, 9).U32(IFLA_MTU, 1500);
+    messages.To(module_);
+
+    EXPECT_THAT(Handlers(), ElementsAre("route-table-down eth0", "link-down eth0",
+                                        "route-table-down eth7", "link-down eth7"));
+    EXPECT_FALSE(root_.Exists("/tmp/.net_link_is_processing"));
+    const NetlinkState state = module_.Snapshot();
+    EXPECT_EQ(state.messages, 9u);
+    EXPECT_FALSE(state.links.at("eth0"));
+    EXPECT_TRUE(state.links.at("bond0s"));
+    EXPECT_FALSE(state.links.at("port0"));
+
+    root_.ClearCalls();
+    EXPECT_EQ(module_.OnInterfaceStatusChange("eth0", true, false), 0);
+    EXPECT_EQ(module_.OnInterfaceStatusChange("eth0", false, true), 1);
+    EXPECT_THAT(Handlers(), ElementsAre("route-table-up eth0", "link-up eth0"));
+}
+
+TEST_F(NetlinkModuleTest, IPv4ChangesRunTheHookWithTheOldAddress) {
+    Reseed();
+    EXPECT_EQ(module_.Snapshot().ipv4.at("eth0"), "10.0.0.2");
+    EXPECT_THAT(module_.Snapshot().ipv4Present.at("eth0"),
+                UnorderedElementsAre("10.0.0.2", "10.0.0.4"));
+
+    Messages messages;
+    IPv4(messages, RTM_NEWADDR, "eth0", "10.0.0.3");
+    IPv4(messages, RTM_NEWADDR, "eth0", "10.0.0.3");     // repeated
+    IPv4(messages, RTM_NEWADDR, "eth5", "192.168.5.1");  // never seen interface
+    IPv4(messages, RTM_DELADDR, "eth5", "192.168.5.1");  // the remembered one
+    IPv4(messages, RTM_DELADDR, "eth0", "10.9.9.9");     // never seen added
+    IPv4(messages, RTM_DELADDR, "eth0", "10.0.0.4");     // seen: taken as a change to it
+    IPv4(messages, RTM_DELADDR, "eth0", "10.0.0.2");     // seen
+    IPv4(messages, RTM_DELADDR, "eth0", "10.0.0.2");     // now gone
+    messages.To(module_);
+
+    EXPECT_THAT(Runs("ipv4_change"),
+                ElementsAre("eth0|10.0.0.2|10.0.0.3|24", "eth5|none|192.168.5.1|24",
+                            "eth0|10.0.0.3|10.0.0.4|24", "eth0|10.0.0.4|10.0.0.2|24"));
+    EXPECT_THAT(module_.Snapshot().ipv4Present.at("eth0"), UnorderedElementsAre("10.0.0.3"));
+}
+
+TEST_F(NetlinkModuleTest, IPv6AdditionsReportTheKnownListAndDeletionsAreSilent) {
+    Messages messages;
+    IPv6(messages, RTM_NEWADDR, "fd00::1");
+    IPv6(messages, RTM_NEWADDR, "fd00::2");
+    IPv6(messages, RTM_NEWADDR, "fd00::2");  // again once duplicate detection is done
+    IPv6(messages, RTM_DELADDR, "fd00::1");
+    IPv6(messages, RTM_DELADDR, "fd00::9");  // never seen added
+    IPv6(messages, RTM_NEWADDR, "fd00::3");
+    IPv6(messages, RTM_NEWADDR, "fd00::4", 0x7FFFFFF0);  // an index the kernel does not know
+    messages.To(module_);
+
+    EXPECT_THAT(Runs("ipv6_change"),
+                ElementsAre("lo||fd00::1|64", "lo|fd00::1|fd00::2|64", "lo|fd00::2|fd00::3|64"));
+    EXPECT_THAT(module_.Snapshot().ipv6.at("lo"), ElementsAre("fd00::2", "fd00::3"));
+}
+
+TEST_F(NetlinkModuleTest, MainTableRouteChangesRunTheGatewayHook) {
+    Messages messages;
+    Route(messages, RTM_NEWROUTE, RT_TABLE_MAIN)
+        .Address(RTA_DST, AF_INET, "10.1.0.0")
+        .Address(RTA_GATEWAY, AF_INET, "10.0.0.1")
+        .U32(RTA_OIF, 1);
+    Route(messages, RTM_DELROUTE, RT_TABLE_MAIN)
+        .Address(RTA_GATEWAY, AF_INET, "10.0.0.1")
+        .U32(RTA_OIF, 1);
+    Route(messages, RTM_NEWROUTE, 100).Address(RTA_GATEWAY, AF_INET, "10.0.0.9").U32(RTA_OIF, 1);
+    messages.To(module_);
+
+    EXPECT_THAT(Runs("gateway_change"),
+                ElementsAre("NEW|lo|10.1.0.0|10.0.0.1", "DEL|lo|0.0.0.0|10.0.0.1"));
+}
+
+TEST_F(NetlinkModuleTest, MalformedMessagesAreSkippedWithoutReadingPastThem) {
+    Messages framed;
+    Link(framed, "eth8", kUp).AttrLength(200);      // attribute past the message
+    Link(framed, "eth8", kUp).AttrLength(0);        // zero-length attribute
+    IPv4(framed, RTM_NEWADDR, "eth8", "10.8.0.1");  // label cut before its end
+    framed.AttrLength(RTA_LENGTH(3));
+    ifaddrmsg info{};
+    info.ifa_family = AF_INET;
+    framed.Add(RTM_NEWADDR, info).Attr(IFA_LOCAL, "\x0a\x08", 2).Text(IFA_LABEL, "eth8");
+    IPv4(framed, RTM_NEWADDR, "eth8;reboot", "10.8.0.2");
+    framed.Add(RTM_NEWLINK, info);  // shorter than a link header
+    Link(framed, "eth9", kUp).U32(200, 1).U32(0x8000 | IFLA_IFNAME, 1);  // unknown types
+    framed.To(module_);
+    // Only the last one was well formed.
+    EXPECT_THAT(Handlers(), ElementsAre("route-table-down eth9", "link-down eth9"));
+    EXPECT_THAT(Runs("ipv4_change"), IsEmpty());
+    EXPECT_EQ(log_.Matching("Skipped netlink message").size(), 6u);
+
+    Messages truncated;
+    Link(truncated, "eth10", kUp);
+    truncated.To(module_, 10);  // less than a header
+    truncated.To(module_, 40);  // nlmsg_len past the read
+    Messages tiny;
+    Link(tiny, "eth11", kUp).MessageLength(8);
+    tiny.To(module_);
+    EXPECT_THAT(Handlers(), ElementsAre("route-table-down eth9", "link-down eth9"));
+    EXPECT_EQ(log_.Matching("bytes of malformed netlink data").size(), 3u);
+
+    EXPECT_EQ(module_.CheckNewLinkEvent(nullptr), -1);
+    EXPECT_EQ(module_.CheckIPChangeEvent(nullptr), -1);
+    EXPECT_EQ(module_.CheckRouteChangeEvent(nullptr), -1);
+    EXPECT_EQ(log_.Matching("netlink_module.cpp:").size(), 6u + 3u + 3u);
+    EXPECT_TRUE(log_.Contains(" Null pointer"));
+}
+
+TEST_F(NetlinkModuleTest, OverrunsReseedAtMostOnceASecond) {
+    root_.WriteFile("/proc/net/if_inet6",
+                    "fd000000000000000000000000000005 02 40 00 80     eth0\n"
+                    "fe800000000000000000000000000001 03 40 20 80    wlan0\n");
+    module_.OnReadFailure(EAGAIN);
+    module_.ReseedIfDue();
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+
+    Reseed();
+    EXPECT_TRUE(log_.Contains("Netlink events lost (receive buffer overrun)"));
+    NetlinkState state = module_.Snapshot();
+    EXPECT_EQ(state.overruns, 1u);
+    EXPECT_EQ(state.reseeds, 1u);
+    EXPECT_FALSE(state.reseedPending);
+    EXPECT_TRUE(state.links.at("eth0"));
+    EXPECT_TRUE(state.links.at("wlan0"));
+    EXPECT_THAT(state.ipv6.at("eth0"), ElementsAre("fd00::5"));
+    EXPECT_THAT(state.ipv6.at("wlan0"), ElementsAre("fe80::1"));
+
+    now_ += std::chrono::milliseconds(400);
+    Reseed();
+    EXPECT_EQ(module_.Snapshot().reseeds, 1u);
+    EXPECT_TRUE(module_.Snapshot().reseedPending);
+    now_ += std::chrono::milliseconds(599);
+    module_.ReseedIfDue();
+    EXPECT_EQ(module_.Snapshot().reseeds, 1u);
+    now_ += std::chrono::milliseconds(1);
+    module_.ReseedIfDue();
+    EXPECT_EQ(module_.Snapshot().reseeds, 2u);
+    now_ += std::chrono::seconds(10);
+    module_.ReseedIfDue();
+    state = module_.Snapshot();
+    EXPECT_EQ(state.reseeds, 2u);
+    EXPECT_EQ(state.overruns, 2u);
+
+    // The seeded addresses count as known.
+    Messages before;
+    IPv6(before, RTM_NEWADDR, "fd00::6");
+    before.To(module_);
+    root_.WriteFile("/proc/net/if_inet6", "00000000000000000000000000000001 01 80 10 80 lo\n");
+    now_ += std::chrono::seconds(1);
+    Reseed();
+    Messages after;
+    IPv6(after, RTM_NEWADDR, "fd00::7");
+    after.To(module_);
+    EXPECT_THAT(Runs("ipv6_change"), ElementsAre("lo||fd00::6|64", "lo|::1|fd00::7|64"));
+
+    // A dump that changed while it was read is taken again a second later.
+    root_.Scenario("ip", std::string("when -4 -o addr show\n") + kEth0Addresses +
+                             "stderr Dump was interrupted and may be inconsistent.\n");
+    now_ += std::chrono::seconds(1);
+    Reseed();
+    EXPECT_TRUE(module_.Snapshot().reseedPending);
+    root_.Scenario("ip", "");
+    now_ += std::chrono::seconds(1);
+    module_.ReseedIfDue();
+    state = module_.Snapshot();
+    EXPECT_FALSE(state.reseedPending);
+    EXPECT_EQ(state.reseeds, 5u);
+    EXPECT_TRUE(state.ipv4Present.empty());
+}
+
+TEST_F(NetlinkModuleTest, RequestDHCPIPReappliesOnlyWiredDHCPInterfaces) {
+    root_.WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth1", "DEVICE=eth1\nBOOTPROTO=static\n");
+    root_.WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth2", "DEVICE=eth2\nBOOTPROTO=dhcp\n");
+    root_.WriteFile("/sys/class/net/eth2/brport/state", "3\n");
+
+    EXPECT_EQ(module_.RequestDHCPIP("wlan0"), 0);
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+    EXPECT_EQ(module_.RequestDHCPIP("eth1"), -1);
+    EXPECT_EQ(module_.RequestDHCPIP("eth2"), -1);
+    EXPECT_THAT(Handlers(), IsEmpty());
+    EXPECT_EQ(module_.RequestDHCPIP("eth0"), 0);
+    EXPECT_THAT(Handlers(), ElementsAre("restart-if eth0"));
+}
+
+}  // namespace
+}  // namespace module
+}  // namespace network
+}  // namespace vornnetwork
