@@ -16,6 +16,11 @@ char* QLIBCStrSep(char** cursor, const char* delims);
  * and returns how many parts the text has, or -1 when a part is empty, not decimal or above 255. */
 int cQLIBISepIP(const char* text, unsigned int* parts, int maxParts);
 
+/* "a.b.c.d/m.m.m.m" -> "network/prefixlen" ("192.168.1.77/255.255.255.0" -> "192.168.1.0/24")
+ * into out (size bytes). 0, or -1 for a malformed text, a mask whose ones are not contiguous or
+ * an out buffer too small. */
+int ErrQLIBIpMaskToSubnet(const char* ipMask, char* out, int size);
+
 #ifdef __cplusplus
 }
 #endif

@@ -38,4 +38,20 @@ TEST(QlibcStrTest, TrimsAndSeparates) {
     EXPECT_EQ(cursor, nullptr);
 }
 
+TEST(QlibcStrTest, IpMaskBecomesNetworkAndPrefixLength) {
+    char out[19] = {};
+    ASSERT_EQ(ErrQLIBIpMaskToSubnet("172.16.200.9/255.255.240.0", out, sizeof(out)), 0);
+    EXPECT_STREQ(out, "172.16.192.0/20");
+    ASSERT_EQ(ErrQLIBIpMaskToSubnet("255.255.255.255/255.255.255.254", out, sizeof(out)), 0);
+    EXPECT_STREQ(out, "255.255.255.254/31");
+    for (const char* bad : {"10.0.0.1/255.255.0.255", "10.0.0.1/0.0.0.255", "10.0.0.1", "10.0.0.1/",
+                            "10.0.0.1/24", "10.0.1/255.0.0.0", "/255.0.0.0"}) {
+        EXPECT_EQ(ErrQLIBIpMaskToSubnet(bad, out, sizeof(out)), -1) << bad;
+    }
+    char exact[11] = {};
+    EXPECT_EQ(ErrQLIBIpMaskToSubnet("10.0.0.1/255.0.0.0", exact, sizeof(exact) - 1), -1);
+    ASSERT_EQ(ErrQLIBIpMaskToSubnet("10.0.0.1/255.0.0.0", exact, sizeof(exact)), 0);
+    EXPECT_STREQ(exact, "10.0.0.0/8");
+}
+
 }  // namespace

@@ -5,6 +5,7 @@
 #include <strings.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
@@ -20,6 +21,8 @@
 #include "platform/qlibc_file.h"
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
+#include "platform/shell_command.h"
+#include "platform/text_file.h"
 #include "utils/interface_name.h"
 
 namespace {
@@ -29,6 +32,9 @@ using vornwireless::utils::IsValidInterfaceName;
 const char kIfcfgPrefix[] = "/etc/sysconfig/network-scripts/ifcfg-";
 const char kNetworkFile[] = "/etc/sysconfig/network";
 const char kEventLog[] = "/var/log/vorn_event.log";
+const char kResolvConf[] = "/etc/resolv.conf";
+const char* const kResolverSources[] = {"/etc/iproute2/config/resolv4.conf",
+                                        "/etc/iproute2/config/resolv6.conf"};
 const char kIp[] = "/sbin/ip";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
 // Bounds on what is read of a routing table and written per event.
@@ -112,29 +118,6 @@ bool ReadAddressKey(const QLIBSZHASH* hash, const char* key, char* field, size_t
     return IsIPv4(value) && CopyToField(field, size, value);
 }
 
-// Lines of a command's output, each whole line at most kMaxRouteLineLength bytes; longer lines
-// are dropped rather than split. False when it could not run or did not exit with 0.
-bool ReadCommandLines(const std::string& commandLine, std::vector<std::string>& lines) {
-    FILE* pipe = popen(vorn::platform::RootShellCommand(commandLine).c_str(), "re");
-    if (pipe == nullptr) {
-        return false;
-    }
-    std::vector<char> buffer(kMaxRouteLineLength + 2);
-    bool partial = false;
-    while (lines.size() < kMaxRouteLines &&
-           std::fgets(buffer.data(), static_cast<int>(buffer.size()), pipe) != nullptr) {
-        const std::string piece = buffer.data();
-        const bool ended = !piece.empty() && piece.back() == '\n';
-        if (!partial && ended) {
-            lines.push_back(piece.substr(0, piece.size() - 1));
-        }
-        partial = !ended;
-    }
-    // Stopping at the bound may end the program by a broken pipe: that is not its failure.
-    const bool bounded = lines.size() >= kMaxRouteLines;
-    return pclose(pipe) == 0 || bounded;
-}
-
 // The gateway of the first "default via GW ..." line; "" when there is none.
 std::string DefaultGateway(const std::vector<std::string>& routes) {
     for (const std::string& route : routes) {
@@ -180,6 +163,20 @@ bool AppendLine(const std::string& path, const std::string& line) {
     const ssize_t written = write(fd, line.data(), line.size());
     close(fd);
     return written == static_cast<ssize_t>(line.size());
+}
+
+// Appends the lines of a resolver source not already in lines; a missing source adds nothing.
+bool AddResolverLines(const char* source, std::vector<std::string>& lines) {
+    std::string text;
+    if (!vorn::platform::ReadTextFile(vorn::platform::RootPath(source), text)) {
+        return QLIBCErrGet() == QLIBC_ERR_NOT_FOUND;
+    }
+    for (const std::string& line : vorn::platform::SplitLines(text)) {
+        if (!line.empty() && std::find(lines.begin(), lines.end(), line) == lines.end()) {
+            lines.push_back(line);
+        }
+    }
+    return true;
 }
 
 }  // namespace
@@ -275,7 +272,11 @@ int VORNNetDefaultGatewayGet(char* buffer, int size) {
     }
     try {
         std::vector<std::string> routes;
-        if (!ReadCommandLines(std::string(kIp) + " -4 route show table main", routes)) {
+        bool succeeded = false;
+        if (vorn::platform::ReadShellCommandLines(std::string(kIp) + " -4 route show table main",
+                                                  routes, kMaxRouteLines, kMaxRouteLineLength,
+                                                  &succeeded) != 0 ||
+            !succeeded) {
             return Fail(QLIBC_ERR_EXEC);
         }
         return CopyResult(buffer, size, DefaultGateway(routes));
@@ -332,6 +333,26 @@ int VORNNetDefaultGatewaySetConf(const char* gateway) {
     }
     return QLIBCFileSetKeys(kNetworkFile, unset ? nullptr : change.get(),
                             unset ? change.get() : nullptr, 0);
+}
+
+int VORNNetDNSUpdate(void) {
+    try {
+        std::vector<std::string> lines;
+        for (const char* source : kResolverSources) {
+            if (!AddResolverLines(source, lines)) {
+                return -1;
+            }
+        }
+        std::string content;
+        for (const std::string& line : lines) {
+            content += line + "\n";
+        }
+        return vorn::platform::WriteFileAtomically(vorn::platform::RootPath(kResolvConf), content)
+                   ? 0
+                   : -1;
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
 }
 
 int VORNLogSet1(int level, int category, unsigned int code, ...) {

@@ -39,6 +39,11 @@ int VORNNetDefaultGatewaySet(const char* gateway);
 int VORNNetDefaultGatewayGetConf(char* buffer, int size);
 int VORNNetDefaultGatewaySetConf(const char* gateway);
 
+/* Regenerates the system resolver file "/etc/resolv.conf" from "/etc/iproute2/config/resolv4.conf"
+ * and "/etc/iproute2/config/resolv6.conf": their lines, IPv4 first, each line once (a missing file
+ * counts as empty). Replaced atomically. 0 or -1. */
+int VORNNetDNSUpdate(void);
+
 /* The system event log: appends one line to "/var/log/vorn_event.log": the time, level, category,
  * the event code in hex (0x%08X) and the text arguments (a null pointer ends them). 0 or -1. */
 int VORNLogSet1(int level, int category, unsigned int code, ...);

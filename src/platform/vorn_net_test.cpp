@@ -133,4 +133,27 @@ TEST_F(VornNetTest, EventLogLinesStayOneLineEach) {
                                   "\t2\t1\t0x0000000B\tforged 2000-01-01 line\n"));
 }
 
+TEST_F(VornNetTest, ResolverFileJoinsBothFamiliesOnce) {
+    root_.WriteFile("/etc/resolv.conf", "nameserver 9.9.9.9\n");
+    ASSERT_EQ(VORNNetDNSUpdate(), 0);
+    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"), "");
+
+    root_.WriteFile("/etc/iproute2/config/resolv4.conf",
+                    "nameserver 10.0.0.1\nnameserver 10.0.0.2\nnameserver 10.0.0.1\n");
+    ASSERT_EQ(VORNNetDNSUpdate(), 0);
+    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"), "nameserver 10.0.0.1\nnameserver 10.0.0.2\n");
+
+    root_.WriteFile("/etc/iproute2/config/resolv6.conf",
+                    "nameserver fe80::1\n\nnameserver 10.0.0.2\nnameserver 2001:db8::53");
+    ASSERT_EQ(VORNNetDNSUpdate(), 0);
+    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"),
+              "nameserver 10.0.0.1\nnameserver 10.0.0.2\nnameserver fe80::1\n"
+              "nameserver 2001:db8::53\n");
+
+    // A source that is not text leaves the system file as it was.
+    root_.WriteFile("/etc/iproute2/config/resolv6.conf", std::string("nameserver \0::1\n", 16));
+    EXPECT_EQ(VORNNetDNSUpdate(), -1);
+    EXPECT_THAT(root_.ReadFile("/etc/resolv.conf"), HasSubstr("2001:db8::53"));
+}
+
 }  // namespace

@@ -77,5 +77,10 @@ int VORNNetSetCard1_S(const VORN_NET_IF_CONFIG* info, int flags) {
     return VORNNetSetCard1(info, flags);
 }
 
+int VORNNetDNSUpdate_S() {
+    Serialised guard("VORNNetDNSUpdate");
+    return VORNNetDNSUpdate();
+}
+
 }  // namespace sdk_s
 }  // namespace vornwireless

@@ -21,6 +21,7 @@ int NetRoutetableHandler_S(int action, const char* ifname);
 int VORNNetIFGetInfo_S(const char* ifname, int flags, VORN_NET_IF_CONFIG* info);
 int BlVORNLnxIsDHCP_S(const char* ifname);
 int VORNNetSetCard1_S(const VORN_NET_IF_CONFIG* info, int flags);
+int VORNNetDNSUpdate_S();
 
 }  // namespace sdk_s
 }  // namespace vornwireless

@@ -1,4 +1,7 @@
-// vornnetdtool: calls the methods of the network daemon's service from the command line.
+// vornnetdtool: calls the methods of the network daemon's service from the command line, and
+// manages the policy and static routes in-process (the service has no methods for them).
+#include <dirent.h>
+
 #include <cstdio>
 #include <cstring>
 #include <functional>
@@ -6,14 +9,25 @@
 #include <vector>
 
 #include "dbus/net_client.h"
+#include "network/route/policy_route.h"
+#include "network/route/static_route.h"
 #include "platform/root_path.h"
+#include "utils/config.h"
 #include "utils/json_text.h"
 #include "utils/log.h"
 
 namespace {
 
 using vornnetwork::dbus::NetClient;
+using vornnetwork::network::IP_TYPE;
+using vornnetwork::network::IP_TYPE_V4;
+using vornnetwork::network::IP_TYPE_V6;
+using vornnetwork::network::PolicyRoute;
+using vornnetwork::network::PolicyRouteRule;
+using vornnetwork::network::StaticRoute;
+using vornnetwork::network::StaticRouteRule;
 using vornwireless::utils::CompactJson;
+using vornwireless::utils::ConfigSection;
 using vornwireless::utils::ParseJson;
 using vornwireless::utils::StyledJson;
 
@@ -104,6 +118,209 @@ const std::vector<Command>& Commands() {
     return commands;
 }
 
+// Route commands: run in this process on the words after the option.
+struct RouteCommand {
+    const char* option;
+    const char* operands;
+    const char* help;
+    size_t minWords;
+    size_t maxWords;
+    // 0 or more on success; usage errors return kUsageError. data is printed when not null.
+    std::function<int(const std::vector<std::string>& words, Json::Value& data)> run;
+};
+
+constexpr int kUsageError = -1000;
+const char kRouteConfigDir[] = "/etc/iproute2/config";
+
+bool ParseFamily(const std::string& word, IP_TYPE& type) {
+    if (word == "-4" || word == "-6") {
+        type = word == "-4" ? IP_TYPE_V4 : IP_TYPE_V6;
+        return true;
+    }
+    return false;
+}
+
+std::vector<IP_TYPE> Families(const std::vector<std::string>& words) {
+    IP_TYPE type = IP_TYPE_V4;
+    if (!words.empty() && ParseFamily(words[0], type)) {
+        return {type};
+    }
+    return {IP_TYPE_V4, IP_TYPE_V6};
+}
+
+bool ParseObject(const std::string& text, Json::Value& value) {
+    return ParseJson(text, value) && value.isObject();
+}
+
+// Owners of the interface rule files of a family ("eth0" for "eth0-table-rule"), static excluded.
+std::vector<std::string> RuleFileOwners(IP_TYPE type) {
+    std::vector<std::string> owners;
+    DIR* dir = opendir(vorn::platform::RootPath(kRouteConfigDir).c_str());
+    if (dir == nullptr) {
+        return owners;
+    }
+    const std::string ending = type == IP_TYPE_V4 ? "-table-rule" : "-table-rule-v6";
+    while (const dirent* entry = readdir(dir)) {
+        const std::string name = entry->d_name;
+        if (name.size() > ending.size() &&
+            name.compare(name.size() - ending.size(), ending.size(), ending) == 0) {
+            const std::string owner = name.substr(0, name.size() - ending.size());
+            if (owner != "static" && vornnetwork::network::RuleFilePath(type, owner) ==
+                                         std::string(kRouteConfigDir) + "/" + name) {
+                owners.push_back(owner);
+            }
+        }
+    }
+    closedir(dir);
+    return owners;
+}
+
+bool HasRule(IP_TYPE type, const std::string& owner, const std::string& name) {
+    ConfigSection rules(vornnetwork::network::RuleFilePath(type, owner));
+    return rules.Read() == 0 && rules.Find(name);
+}
+
+// --del-policy-route-rule -4|-6 NAME [IFNAME]: without IFNAME from every interface that has it.
+int DeletePolicyRule(const std::vector<std::string>& words, Json::Value&) {
+    IP_TYPE type = IP_TYPE_V4;
+    if (!ParseFamily(words[0], type)) {
+        return kUsageError;
+    }
+    PolicyRoute policy;
+    if (words.size() == 3) {
+        return policy.DeleteRule(type, words[2], words[1]);
+    }
+    int result = 0;
+    for (const std::string& owner : RuleFileOwners(type)) {
+        if (HasRule(type, owner, words[1]) && policy.DeleteRule(type, owner, words[1]) != 0) {
+            result = -1;
+        }
+    }
+    return result;
+}
+
+// --disable-route-table [-4|-6 [IFNAME]]: without IFNAME every interface table left without
+// rules, as after --del-policy-route-rule.
+int DisableRouteTable(const std::vector<std::string>& words, Json::Value&) {
+    IP_TYPE type = IP_TYPE_V4;
+    if (!words.empty() && !ParseFamily(words[0], type)) {
+        return kUsageError;
+    }
+    PolicyRoute policy;
+    if (words.size() == 2) {
+        return policy.DisableTable(type, words[1]);
+    }
+    Json::Value enabled;
+    if (policy.GetEnableTables(enabled) != 0) {
+        return -1;
+    }
+    int result = 0;
+    for (IP_TYPE family : Families(words)) {
+        for (const Json::Value& table : enabled["tables"]) {
+            const std::string owner = table["ifname"].asString();
+            const bool on = table[family == IP_TYPE_V4 ? "enable" : "enable_v6"].asBool();
+            if (on && owner != "static" &&
+                policy.IsRulesEmpty(vornnetwork::network::RuleFilePath(family, owner)) &&
+                policy.DisableTable(family, owner) != 0) {
+                result = -1;
+            }
+        }
+    }
+    return result;
+}
+
+int AddPolicyRule(const std::vector<std::string>& words, Json::Value&) {
+    IP_TYPE type = IP_TYPE_V4;
+    Json::Value json;
+    if (!ParseFamily(words[0], type) || !ParseObject(words[1], json)) {
+        return kUsageError;
+    }
+    for (const char* key : {"ifname", "name", "ip", "mask", "prefix_length", "gateway"}) {
+        if (!json[key].isNull() && !json[key].isString()) {
+            return kUsageError;
+        }
+    }
+    PolicyRouteRule rule;
+    rule.type = type;
+    rule.ifname = json["ifname"].asString();
+    rule.name = json["name"].asString();
+    rule.ip = json["ip"].asString();
+    rule.mask = json["mask"].asString();
+    rule.prefix_length = json["prefix_length"].asString();
+    rule.gateway = json["gateway"].asString();
+    return PolicyRoute().AddRule(rule);
+}
+
+int SetStaticRoutes(const std::vector<std::string>& words, Json::Value&) {
+    IP_TYPE type = IP_TYPE_V4;
+    Json::Value json;
+    if (!ParseFamily(words[0], type) || !ParseObject(words[1], json)) {
+        return kUsageError;
+    }
+    return StaticRoute().SetRules(type, json);
+}
+
+int ValidateStaticRoute(const std::vector<std::string>& words, Json::Value& data) {
+    IP_TYPE type = IP_TYPE_V4;
+    if (!ParseFamily(words[0], type) || !ParseObject(words[1], data)) {
+        return kUsageError;
+    }
+    StaticRouteRule rule;
+    if (StaticRoute::RuleFromJson(type, data, rule) != 0) {
+        return -1;
+    }
+    return StaticRoute().TestRuleVaild(rule, data);
+}
+
+const std::vector<RouteCommand>& RouteCommands() {
+    static const std::vector<RouteCommand> commands = {
+        {"--list-policy-tables", "", "the enabled policy tables", 0, 0,
+         [](const std::vector<std::string>&, Json::Value& d) {
+             return PolicyRoute().GetEnableTables(d);
+         }},
+        {"--enable-route-table", "-4|-6 IFNAME SOURCE[,SOURCE]",
+         "route the sources (address, network or all) by IFNAME-table", 3, 3,
+         [](const std::vector<std::string>& w, Json::Value&) {
+             IP_TYPE type = IP_TYPE_V4;
+             return ParseFamily(w[0], type) ? PolicyRoute().EnableTable(type, w[1], w[2])
+                                            : kUsageError;
+         }},
+        {"--disable-route-table", "[-4|-6 [IFNAME]]",
+         "disable IFNAME-table; without IFNAME every table left without rules", 0, 2,
+         DisableRouteTable},
+        {"--add-policy-route-rule", "-4|-6 JSON",
+         "add or replace a rule of an interface table (JSON below)", 2, 2, AddPolicyRule},
+        {"--del-policy-route-rule", "-4|-6 NAME [IFNAME]",
+         "delete rule NAME of IFNAME, or of every interface", 2, 3, DeletePolicyRule},
+        {"--set-static-routes", "-4|-6 JSON", "replace the static routes ({\"rules\":[...]})", 2, 2,
+         SetStaticRoutes},
+        {"--get-static-routes", "-4|-6", "the static routes with their \"active\" state", 1, 1,
+         [](const std::vector<std::string>& w, Json::Value& d) {
+             IP_TYPE type = IP_TYPE_V4;
+             return ParseFamily(w[0], type) ? StaticRoute().GetRules(type, d) : kUsageError;
+         }},
+        {"--validate-static-route", "-4|-6 JSON",
+         "try one route in the kernel; prints it with its network address", 2, 2,
+         ValidateStaticRoute},
+        {"--refresh-static-routes", "", "reinstall the stored static routes of both families", 0, 0,
+         [](const std::vector<std::string>&, Json::Value&) {
+             return StaticRoute().RefreshRules();
+         }},
+        {"--show-route-tables", "-4|-6 [TABLE]",
+         "the routes of main, static-table and the enabled tables, or of TABLE", 1, 2,
+         [](const std::vector<std::string>& w, Json::Value& d) {
+             IP_TYPE type = IP_TYPE_V4;
+             if (!ParseFamily(w[0], type)) {
+                 return kUsageError;
+             }
+             StaticRoute routes;
+             return w.size() == 1 ? routes.GetRouteTables(type, d)
+                                  : routes.GetTableInfo(type, w[1], d);
+         }},
+    };
+    return commands;
+}
+
 void Usage(FILE* out) {
     std::fprintf(out,
                  "Usage: vornnetdtool [--compact] COMMAND ARGUMENT\n"
@@ -120,7 +337,47 @@ void Usage(FILE* out) {
         "  --ready                           exit 0 when vornnetd runs and owns its name\n\n"
         "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
         "Example: vornnetdtool --add-gateway "
-        "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n");
+        "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n\n"
+        "Route commands (run here, not in vornnetd; -4 IPv4, -6 IPv6):\n");
+    for (const RouteCommand& command : RouteCommands()) {
+        std::fprintf(out, "  %s %s\n      %s\n", command.option, command.operands, command.help);
+    }
+    std::fprintf(
+        out,
+        "A policy rule: {\"ifname\":\"eth0\",\"name\":\"lan\",\"ip\":\"10.1.0.0\","
+        "\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\"}\n"
+        "  (IPv6: \"prefix_length\":\"64\" for \"mask\"; no \"ip\": the table's default route).\n"
+        "A static route: {\"ip\":\"10.1.0.0\",\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\","
+        "\"ifname\":\"eth0\",\"enable\":true}.\n");
+}
+
+// Runs a route command when words name one; false when they do not.
+bool RunRouteCommand(const std::vector<std::string>& words, bool compact, int& status) {
+    for (const RouteCommand& command : RouteCommands()) {
+        if (words.empty() || words[0] != command.option) {
+            continue;
+        }
+        const std::vector<std::string> operands(words.begin() + 1, words.end());
+        Json::Value data;
+        const int result = operands.size() < command.minWords || operands.size() > command.maxWords
+                               ? kUsageError
+                               : command.run(operands, data);
+        if (result == kUsageError) {
+            std::fprintf(stderr, "vornnetdtool: usage: %s %s\n", command.option, command.operands);
+            status = 2;
+        } else if (result < 0) {
+            std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command.option, result);
+            status = 1;
+        } else {
+            if (!data.isNull()) {
+                std::printf(
+                    "%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
+            }
+            status = 0;
+        }
+        return true;
+    }
+    return false;
 }
 
 bool BuildRequest(const Command& command, const std::string& text, Json::Value& request) {
@@ -179,6 +436,10 @@ int main(int argc, char** argv) {
         const bool ready = NetClient().IsServerReady();
         std::printf("%s\n", ready ? "ready" : "not ready");
         return ready ? 0 : 1;
+    }
+    int status = 0;
+    if (RunRouteCommand(words, compact, status)) {
+        return status;
     }
     const Command* command = nullptr;
     for (const Command& candidate : Commands()) {
