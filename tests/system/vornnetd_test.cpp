@@ -15,6 +15,7 @@
 #include "support/log_capture.h"
 #include "support/private_bus.h"
 #include "support/sim_root.h"
+#include "utils/json_text.h"
 
 namespace vorn {
 namespace test {
@@ -32,7 +33,7 @@ constexpr Timeout kCallTimeout{20000};
 constexpr Timeout kExitTimeout{20000};
 
 // One method of the service, an argument it accepts, and the error it answers while its module
-// is missing.
+// is missing (null: its module, the route module, is there and answers).
 struct Method {
     const char* name;
     const char* in;
@@ -47,20 +48,17 @@ const Method kMethods[] = {
     {"SetDeviceListData", "data", "", true, R"({"macAddr":"00:11:22:33:44:55","type":"nas"})",
      "failed to set device type"},
     {"DelDeviceListData", "mac", "", false, "00:11:22:33:44:55", "failed to set delete data"},
-    {"GetGatewayListData", "info", "data", true, R"({"type":"GTYPE_V4"})",
-     "failed to get gateway list data"},
+    {"GetGatewayListData", "info", "data", true, R"({"type":"GTYPE_V4"})", nullptr},
     {"AddGatewayData", "info", "", true,
-     R"({"type":"GTYPE_V4","ifname":"eth0","priority":0,"gateway":"10.0.0.1"})",
-     "failed to add gateway data"},
-    {"DelGatewayData", "info", "", true, R"({"type":"GTYPE_V4","ifname":"eth0"})",
-     "failed to del gateway data"},
+     R"({"type":"GTYPE_V4","ifname":"eth0","priority":0,"gateway":"10.0.0.1"})", nullptr},
+    {"DelGatewayData", "info", "", true, R"({"type":"GTYPE_V4","ifname":"eth0"})", nullptr},
     {"GetGatewayDataByInterface", "info", "data", true, R"({"type":"GTYPE_V4","ifname":"eth0"})",
-     "failed to get gateway data by interface"},
-    {"SetSlaveData", "info", "", true, R"({"ifname":"eth0","slave":true})",
-     "failed to set slave data"},
-    {"CopyGatewayData", "info", "", true, R"({"type":"GTYPE_V4","src":"eth0","dst":"bond0"})",
-     "failed to copy gateway data"},
-    {"RefreshGateway", "type", "", true, R"({"type":"ALL"})", "failed to refresh gateway"},
+     nullptr},
+    {"SetSlaveData", "info", "", true, R"({"type":"GTYPE_V4","ifname":"eth0","slave":true})",
+     nullptr},
+    {"CopyGatewayData", "info", "", true,
+     R"({"type":"GTYPE_V4","interface_source":"eth0","interface_destination":"bond0"})", nullptr},
+    {"RefreshGateway", "type", "", true, R"({"type":"ALL"})", nullptr},
     {"ResetIPv6Module", "info", "", false, "eth0", "failed to reset ipv6 module"},
 };
 
@@ -164,8 +162,9 @@ class VornnetdTest : public ::testing::Test {
 
     // The daemon is up and serving: a call gets its module's answer.
     void ExpectServing() {
-        const Answer answer = CallService("GetGatewayListData", R"({"type":"GTYPE_V4"})");
-        EXPECT_EQ(answer.text, "failed to get gateway list data");
+        const Answer answer = CallService("GetDeviceListData", std::string("upnp"));
+        EXPECT_EQ(answer.text, "failed to get upnp data");
+        EXPECT_TRUE(CallService("GetGatewayListData", R"({"type":"GTYPE_V4"})").ok);
         EXPECT_TRUE(daemon_.Running()) << daemon_.Stderr();
     }
 
@@ -181,17 +180,20 @@ TEST_F(VornnetdTest, ServesEveryMethodToBothClients) {
     Json::Value info;
     info["type"] = "GTYPE_V4";
     Json::Value data;
-    EXPECT_EQ(client.GetGatewayListData(info, data), -1);
-    EXPECT_TRUE(log_.Contains("Failed to send message: failed to get gateway list data (-1)"));
+    EXPECT_EQ(client.GetGatewayListData(info, data), 0);
+    EXPECT_EQ(data, Json::Value(Json::arrayValue));
     EXPECT_EQ(client.GetDeviceListData("upnp", data), -1);
+    EXPECT_TRUE(log_.Contains("Failed to send message: failed to get upnp data (-1)"));
     EXPECT_EQ(client.DelDeviceListData("00:11:22:33:44:55"), -1);
     // The error number is read from the text: the 6 of "ipv6".
     EXPECT_EQ(client.ResetIPv6Module("eth0"), -6);
 
     for (const Method& method : kMethods) {
         const Answer answer = GdbusCall(method.name, method.argument);
-        EXPECT_FALSE(answer.ok) << method.name;
-        EXPECT_EQ(answer.text, method.error) << method.name;
+        EXPECT_EQ(answer.ok, method.error == nullptr) << method.name << ": " << answer.text;
+        if (method.error != nullptr) {
+            EXPECT_EQ(answer.text, method.error) << method.name;
+        }
     }
 
     std::string xml;
@@ -246,11 +248,17 @@ TEST_F(VornnetdTest, BadInputGetsAnErrorAndChangesNothing) {
         ExpectServing();
     }
 
-    // Well-formed objects whose keys have the wrong types are the module's to refuse.
+    // Well-formed objects whose keys have the wrong types are the module's to refuse: the route
+    // module logs them and answers, changing nothing.
     const std::string wrongTypes =
         R"({"type":7,"ifname":["eth0"],"priority":"high","gateway":{},"method":false})";
     for (const Method& method : kMethods) {
-        EXPECT_EQ(CallService(method.name, wrongTypes).text, method.error) << method.name;
+        const Answer answer = CallService(method.name, wrongTypes);
+        EXPECT_EQ(answer.ok, method.error == nullptr) << method.name;
+        EXPECT_EQ(answer.text, method.error != nullptr ? method.error
+                               : *method.out != '\0'   ? "null\n"
+                                                       : "")
+            << method.name;
     }
 
     EXPECT_EQ(CallService("AddGatewayData", g_variant_new("(i)", 7)).errorName,
@@ -261,6 +269,48 @@ TEST_F(VornnetdTest, BadInputGetsAnErrorAndChangesNothing) {
               "org.freedesktop.DBus.Error.UnknownMethod");
     ExpectServing();
     EXPECT_EQ(Snapshot(root_, kRouteConfig), before);
+}
+
+TEST_F(VornnetdTest, GatewayMethodsReachTheRouteModule) {
+    root_.Scenario("ip", "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n");
+    vornnetwork::dbus::NetClient client;
+    Json::Value info;
+    ASSERT_TRUE(vornwireless::utils::ParseJson(
+        R"({"type":"GTYPE_V4","ifname":"eth0","priority":0,"gateway":"10.0.0.1","dns":"10.0.0.53"})",
+        info));
+    EXPECT_EQ(client.AddGatewayData(info), 0);
+    EXPECT_TRUE(CallService("AddGatewayData", R"({"type":"GTYPE_V4","ifname":"wlan0",)"
+                                              R"("priority":0,"gateway":"10.1.0.1"})")
+                    .ok);
+    EXPECT_TRUE(
+        CallService("SetSlaveData", R"({"type":"GTYPE_V4","ifname":"wlan0","slave":true})").ok);
+    EXPECT_TRUE(CallService("CopyGatewayData", R"({"type":"GTYPE_V4","interface_source":"eth0",)"
+                                               R"("interface_destination":"bond0",)"
+                                               R"("interface_source_delete":true})")
+                    .ok);
+    Json::Value data;
+    info = Json::Value(Json::objectValue);
+    info["type"] = "GTYPE_V4";
+    ASSERT_EQ(client.GetGatewayListData(info, data), 0);
+    ASSERT_EQ(data.size(), 2u);
+    EXPECT_EQ(data[0]["ifname"].asString(), "bond0");
+    EXPECT_EQ(data[0]["dns"].asString(), "10.0.0.53");
+    EXPECT_EQ(data[1]["ifname"].asString(), "wlan0");
+    EXPECT_TRUE(data[1]["slave"].asBool());
+    info["ifname"] = "wlan0";
+    ASSERT_EQ(client.GetGatewayDataByInterface(info, data), 0);
+    EXPECT_EQ(data["priority"].asInt(), 1);
+    EXPECT_TRUE(data["exist"].asBool());
+
+    root_.ClearCalls();
+    EXPECT_TRUE(CallService("RefreshGateway", R"({"type":"ALL"})").ok);
+    const std::vector<std::string> calls = root_.Calls();
+    ASSERT_FALSE(calls.empty());
+    EXPECT_EQ(calls.back(), "/sbin/ip route add default via 10.0.0.1 dev bond0");
+    EXPECT_TRUE(CallService("DelGatewayData", R"({"type":"GTYPE_V4","ifname":"bond0"})").ok);
+    EXPECT_EQ(root_.ReadFile(std::string(kRouteConfig) + "/gateway_v4_priority"),
+              "[0]\n\tclass=unknown\n\tdns=\n\tgateway=10.1.0.1\n\tifname=wlan0\n\tslave=yes\n");
+    EXPECT_EQ(root_.ReadFile(std::string(kRouteConfig) + "/resolv4.conf"), "");
 }
 
 TEST_F(VornnetdTest, RefusesToStartWithoutItsPidFileOrItsBus) {
@@ -312,9 +362,11 @@ TEST_F(VornnetdTest, ToolAnswersThroughItsExitStatus) {
     EXPECT_EQ(RunProgram({kTool, "--add-gateway", "not json"}, kCallTimeout, &out, &err), 2);
     EXPECT_THAT(err, HasSubstr("'not json' is not a JSON object"));
 
-    EXPECT_EQ(RunProgram({kTool, "--get-gateway-list", "v4"}, kCallTimeout, &out, &err), 1);
+    EXPECT_EQ(RunProgram({kTool, "--get-device-list", "upnp"}, kCallTimeout, &out, &err), 1);
     EXPECT_EQ(out, "");
-    EXPECT_THAT(err, HasSubstr("--get-gateway-list failed (-1)"));
+    EXPECT_THAT(err, HasSubstr("--get-device-list failed (-1)"));
+    EXPECT_EQ(RunProgram({kTool, "--get-gateway-list", "v4"}, kCallTimeout, &out, &err), 0);
+    EXPECT_EQ(out, "[]\n");
 
     EXPECT_EQ(RunProgram({kTool, "--ready"}, kCallTimeout, &out), 0);
     EXPECT_EQ(out, "ready\n");

@@ -1,6 +1,7 @@
 #include "network/module/module_manager.h"
 
 #include "network/module/netlink_module.h"
+#include "network/module/route_module.h"
 #include "network/module/test_module.h"
 #include "utils/log.h"
 
@@ -18,7 +19,7 @@ BaseModule* NotBuiltYet() {
 
 const ModuleManager::MODULE_INFO ModuleManager::module_info[5] = {
     {MODULE_TEST, false, &TestModule::Create}, {MODULE_NETLINK, true, &NetlinkModule::Create},
-    {MODULE_IPV6, true, &NotBuiltYet},         {MODULE_ROUTE, true, &NotBuiltYet},
+    {MODULE_IPV6, true, &NotBuiltYet},         {MODULE_ROUTE, true, &RouteModule::Create},
     {MODULE_DEVICE_LIST, true, &NotBuiltYet},
 };
 

@@ -1,0 +1,342 @@
+#include "network/module/route_module.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "support/sim_root.h"
+#include "utils/json_text.h"
+
+namespace vornnetwork {
+namespace network {
+namespace module {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+constexpr char kV4File[] = "/etc/iproute2/config/gateway_v4_priority";
+constexpr char kV6File[] = "/etc/iproute2/config/gateway_v6_priority";
+constexpr char kDatabase[] = "/etc/iproute2/config/gateway_database";
+constexpr char kResolv4[] = "/etc/iproute2/config/resolv4.conf";
+constexpr char kResolv6[] = "/etc/iproute2/config/resolv6.conf";
+
+class RouteModuleTest : public vorn::test::RootTest {
+  protected:
+    // Sends a request written as JSON text; its answer.
+    Json::Value Send(const std::string& text) {
+        Json::Value request;
+        EXPECT_TRUE(vornwireless::utils::ParseJson(text, request)) << text;
+        Json::Value answer;
+        EXPECT_EQ(module_.ProcessRequest(request, answer), 0);
+        return answer;
+    }
+    void Add(const char* type, const std::string& ifname, int priority,
+             const std::string& more = "") {
+        Send(std::string(R"({"method":"ADD_GATEWAY_DATA","type":")") + type + R"(","ifname":")" +
+             ifname + R"(","priority":)" + std::to_string(priority) + more + "}");
+    }
+    std::vector<std::string> Names(GATEWAY_TYPE type) const {
+        std::vector<std::string> names;
+        for (const GatewayInfo& entry : module_.GetList(type)) {
+            names.push_back(entry.ifname);
+        }
+        return names;
+    }
+    std::string Files() const {
+        std::string all;
+        for (const char* file : {kV4File, kV6File, kDatabase, kResolv4, kResolv6}) {
+            all += std::string(file) + ":\n" + root_.ReadFile(file);
+        }
+        return all;
+    }
+
+    RouteModule module_;
+};
+
+TEST_F(RouteModuleTest, PrioritiesPlaceEntries) {
+    Add("GTYPE_V4", "eth1", 0);
+    Add("GTYPE_V4", "eth0", 0);
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth0", "eth1"));
+    // -2 keeps an entry where it stands and merges the new fields.
+    Add("GTYPE_V4", "eth0", -2, R"(,"gateway":"10.0.0.1")");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth0", "eth1"));
+    EXPECT_EQ(module_.GetList(GTYPE_V4)[0].gateway.ToString(), "10.0.0.1");
+    Add("GTYPE_V4", "eth2", -2);
+    Add("GTYPE_V4", "eth3", 3);
+    Add("GTYPE_V4", "eth4", 99);
+    Add("GTYPE_V4", "eth5", -7);
+    Add("GTYPE_V4", "eth6", 1);
+    EXPECT_THAT(Names(GTYPE_V4),
+                ElementsAre("eth0", "eth6", "eth1", "eth2", "eth3", "eth4", "eth5"));
+    Add("GTYPE_V4", "eth0", -1);
+    Add("GTYPE_V4", "eth5", 0);
+    EXPECT_THAT(Names(GTYPE_V4),
+                ElementsAre("eth5", "eth6", "eth1", "eth2", "eth3", "eth4", "eth0"));
+    EXPECT_THAT(Names(GTYPE_V6), IsEmpty());
+
+    Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth6"})");
+    Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth9"})");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth5", "eth1", "eth2", "eth3", "eth4", "eth0"));
+    const Json::Value list = Send(R"({"method":"GET_GATEWAY_LIST_DATA","type":"GTYPE_V4"})");
+    ASSERT_EQ(list.size(), 6u);
+    EXPECT_EQ(list[5]["priority"].asInt(), 5);
+    EXPECT_EQ(list[5]["ifname"].asString(), "eth0");
+    EXPECT_EQ(list[5]["gateway"].asString(), "10.0.0.1");
+    EXPECT_EQ(Send(R"({"method":"GET_GATEWAY_LIST_DATA","type":"GTYPE_V6"})"),
+              Json::Value(Json::arrayValue));
+}
+
+TEST_F(RouteModuleTest, NullKeepsAFieldAndEmptyTextClearsIt) {
+    Add("GTYPE_V4", "eth0", 0, R"(,"gateway":"10.0.0.1","dns":"10.0.0.53","class":"ethernet")");
+    Add("GTYPE_V4", "eth0", -2, R"(,"gateway":"NULL","dns":"NULL","class":"NULL")");
+    Json::Value entry =
+        Send(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V4","ifname":"eth0"})");
+    EXPECT_EQ(vornwireless::utils::CompactJson(entry),
+              R"({"class":"ethernet","dns":"10.0.0.53","exist":true,"gateway":"10.0.0.1",)"
+              R"("ifname":"eth0","priority":0,"slave":false})");
+    Add("GTYPE_V4", "eth0", -2, R"(,"gateway":"","class":"")");
+    entry = Send(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V4","ifname":"eth0"})");
+    EXPECT_EQ(entry["gateway"].asString(), "");
+    EXPECT_EQ(entry["dns"].asString(), "10.0.0.53");
+    EXPECT_EQ(entry["class"].asString(), "");
+
+    entry = Send(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V6","ifname":"eth0"})");
+    EXPECT_EQ(vornwireless::utils::CompactJson(entry),
+              R"({"class":"unknown","dns":"","exist":false,"gateway":"","priority":-1,)"
+              R"("slave":false})");
+}
+
+TEST_F(RouteModuleTest, SlavesGoLastAndCopiesTakeTheSourcePlace) {
+    for (const char* name : {"eth0", "eth1", "eth2"}) {
+        Add("GTYPE_V4", name, -1, R"(,"gateway":"10.0.0.1")");
+    }
+    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth0","slave":true})");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "eth0"));
+    EXPECT_TRUE(module_.GetList(GTYPE_V4)[2].slave);
+    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth1","slave":false})");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "eth0"));
+    const std::string files = Files();
+    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth7","slave":true})");
+    EXPECT_EQ(Files(), files);
+
+    Send(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth2",)"
+         R"("interface_destination":"bond0"})");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "bond0", "eth2", "eth0"));
+    EXPECT_EQ(module_.GetList(GTYPE_V4)[1].gateway.ToString(), "10.0.0.1");
+    // The old destination entry goes first, so the copy lands where the source stands then.
+    Send(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth0",)"
+         R"("interface_destination":"bond0","interface_source_delete":true})");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "bond0"));
+    EXPECT_TRUE(module_.GetList(GTYPE_V4)[2].slave);
+    EXPECT_THAT(root_.ReadFile(kDatabase), ::testing::HasSubstr("[bond0]\n"));
+}
+
+TEST_F(RouteModuleTest, FilesAreWrittenByteForByte) {
+    root_.WriteFile(kDatabase, "[br0]\n\tgateway=192.168.1.1\n\tother=kept\n");
+    Add("GTYPE_V4", "eth0", 0, R"(,"gateway":"10.0.0.1","dns":"10.0.0.53","class":"ethernet")");
+    Add("GTYPE_V4", "wlan0", -1, R"(,"gateway":"10.1.0.1")");
+    Add("GTYPE_V6", "eth0", 0, R"(,"gateway":"fe80::1","dns":"2001:db8::53")");
+    Add("GTYPE_V6", "sit0", 1, R"(,"gateway":"::","dns":"")");
+    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"wlan0","slave":true})");
+
+    EXPECT_EQ(root_.ReadFile(kV4File),
+              "[0]\n\tclass=ethernet\n\tdns=10.0.0.53\n\tgateway=10.0.0.1\n\tifname=eth0\n"
+              "\tslave=no\n"
+              "[1]\n\tclass=unknown\n\tdns=\n\tgateway=10.1.0.1\n\tifname=wlan0\n\tslave=yes\n");
+    EXPECT_EQ(root_.ReadFile(kV6File),
+              "[0]\n\tclass=unknown\n\tdns=2001:db8::53\n\tgateway=fe80::1\n\tifname=eth0\n"
+              "\tslave=no\n"
+              "[1]\n\tclass=unknown\n\tdns=\n\tgateway=::\n\tifname=sit0\n\tslave=no\n");
+    EXPECT_EQ(root_.ReadFile(kDatabase),
+              "[br0]\n\tgateway=192.168.1.1\n\tother=kept\n"
+              "[eth0]\n\tdns=10.0.0.53\n\tdns_v6=2001:db8::53\n\tgateway=10.0.0.1\n"
+              "\tgateway_v6=fe80::1\n"
+              "[sit0]\n\tdns_v6=\n\tgateway_v6=::\n"
+              "[wlan0]\n\tdns=\n\tgateway=10.1.0.1\n");
+    EXPECT_EQ(root_.ReadFile(kResolv4), "nameserver 10.0.0.53\n");
+    EXPECT_EQ(root_.ReadFile(kResolv6), "nameserver 2001:db8::53\n");
+    // dns_mode is "auto" in the factory settings: the system resolver follows.
+    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"),
+              "nameserver 10.0.0.53\nnameserver 2001:db8::53\n");
+
+    // A delete rewrites the list and the resolver file, not the database.
+    Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth0"})");
+    EXPECT_EQ(root_.ReadFile(kResolv4), "");
+    EXPECT_THAT(root_.ReadFile(kDatabase), ::testing::HasSubstr("\tgateway=10.0.0.1\n"));
+}
+
+TEST_F(RouteModuleTest, MoreThanTenEntriesReadBackInTextOrder) {
+    for (int i = 0; i < 11; ++i) {
+        Add("GTYPE_V4", "eth" + std::to_string(i), -1);
+    }
+    RouteModule restarted;
+    ASSERT_EQ(restarted.Initialize(), 0);
+    std::vector<std::string> names;
+    for (const GatewayInfo& entry : restarted.GetList(GTYPE_V4)) {
+        names.push_back(entry.ifname);
+    }
+    EXPECT_THAT(names, ElementsAre("eth0", "eth1", "eth10", "eth2", "eth3", "eth4", "eth5", "eth6",
+                                   "eth7", "eth8", "eth9"));
+    EXPECT_THAT(restarted.GetList(GTYPE_V6), IsEmpty());
+    // Start-up re-enables the static table.
+    const std::vector<std::string> calls = root_.Calls();
+    EXPECT_TRUE(std::any_of(calls.begin(), calls.end(), [](const std::string& call) {
+        return call.find("static") != std::string::npos;
+    }));
+
+    root_.WriteFile(kV6File, "[0]\n\tifname=eth0;reboot\n\tgateway=::\n[1]\n\tifname=eth1\n");
+    EXPECT_EQ(module_.ReadGatewayListFromFile(GTYPE_V6), 0);
+    EXPECT_THAT(Names(GTYPE_V6), ElementsAre("eth1"));
+    EXPECT_EQ(module_.ReadGatewayListFromFile(static_cast<GATEWAY_TYPE>(2)), -1);
+    EXPECT_TRUE(log_.Contains("route_module.cpp:"));
+    EXPECT_TRUE(log_.Contains("Unknown type to read config"));
+}
+
+TEST_F(RouteModuleTest, IPv4RefreshInstallsTheFirstUsableEntry) {
+    Add("GTYPE_V4", "eth3", -1, R"(,"gateway":"10.3.0.1")");
+    Add("GTYPE_V4", "eth0", -1, R"(,"gateway":"10.0.0.1","class":"ethernet")");
+    Add("GTYPE_V4", "wlan0", -1, R"(,"gateway":"10.2.0.1","class":"ethernet")");
+    Add("GTYPE_V4", "eth1", -1, R"(,"gateway":"10.1.0.1","class":"ethernet")");
+    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth3","slave":true})");
+    root_.Scenario("ip",
+                   "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n"
+                   "when route add default via 10.2.0.1 dev wlan0\nexit 2\n");
+    root_.Scenario("ethtool", "when eth0\nprint \tLink detected: no\n");
+    const std::string files = Files();
+    root_.ClearCalls();
+
+    Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V4"})");
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/ip -4 route show table main", "/sbin/ip route show table main",
+                            "/sbin/ip -4 route show table main", "/sbin/ip -4 route del default",
+                            "/usr/vorn/bin/ethtool eth0",
+                            "/sbin/ip route add default via 10.2.0.1 dev wlan0",
+                            "/usr/vorn/bin/ethtool eth1",
+                            "/sbin/ip route add default via 10.1.0.1 dev eth1"));
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth0", "wlan0", "eth3"));
+    EXPECT_EQ(Files(), files);
+
+    // None works: the old gateway comes back.
+    root_.Scenario("ip",
+                   "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n"
+                   "when route add *\nexit 2\n");
+    root_.ClearCalls();
+    Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth1","priority":-2,)"
+         R"("refresh":true})");
+    const std::vector<std::string> calls = root_.Calls();
+    ASSERT_FALSE(calls.empty());
+    EXPECT_EQ(calls.back(), "/sbin/ip -4 route replace default via 10.9.0.1");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth0", "wlan0", "eth3"));
+
+    RouteModule empty;
+    root_.ClearCalls();
+    EXPECT_EQ(empty.RefreshDefaultGatewayV4(), 0);
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+}
+
+TEST_F(RouteModuleTest, IPv6RefreshReplacesEveryDefaultRoute) {
+    Add("GTYPE_V6", "eth0", -1, R"(,"gateway":"fe80::1","class":"ethernet")");
+    Add("GTYPE_V6", "sit0", -1, R"(,"gateway":"::")");
+    Add("GTYPE_V6", "eth1", -1, R"(,"gateway":"fe80::2")");
+    root_.Scenario("ip",
+                   "when -6 route show table main\nprint default via fe80::9 dev eth9\n"
+                   "print default via fe80::8 dev eth8\n");
+    root_.Scenario("ethtool", "when eth0\nprint \tLink detected: no\n");
+    root_.ClearCalls();
+
+    Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V6"})");
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/ip -6 route show table main", "/sbin/ip -6 route delete default",
+                            "/sbin/ip -6 route delete default", "/usr/vorn/bin/ethtool eth0",
+                            "/sbin/ip -6 route add default dev sit0"));
+    EXPECT_THAT(Names(GTYPE_V6), ElementsAre("sit0", "eth0", "eth1"));
+
+    root_.Scenario("ip", "when -6 route add default dev sit0\nexit 2\n");
+    root_.ClearCalls();
+    Send(R"({"method":"REFRESH_GATEWAY","type":"ALL"})");
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/ip -6 route show table main",
+                            "/sbin/ip -6 route add default dev sit0", "/usr/vorn/bin/ethtool eth0",
+                            "/sbin/ip -6 route add default via fe80::2 dev eth1"));
+    EXPECT_THAT(Names(GTYPE_V6), ElementsAre("eth1", "sit0", "eth0"));
+
+    Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V5"})");
+    EXPECT_TRUE(log_.Contains("Unknown type to add info"));
+}
+
+TEST_F(RouteModuleTest, BadRequestsChangeNothing) {
+    Add("GTYPE_V4", "eth0", 0, R"(,"gateway":"10.0.0.1","dns":"10.0.0.53")");
+    Add("GTYPE_V6", "eth0", 0, R"(,"gateway":"fe80::1")");
+    const std::string files = Files();
+    root_.ClearCalls();
+    log_.Clear();
+
+    const char* const requests[] = {
+        R"({"method":"ADD_GATEWAY_DATA","ifname":"eth1","priority":0,"refresh":true})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V9","ifname":"eth1","refresh":true})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth1","priority":"high"})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth1;reboot","priority":0})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"abcdefghijklmnop"})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","priority":0,"refresh":true})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth0","gateway":"10.0.1"})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth0","gateway":"fe80::1"})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V6","ifname":"eth0","dns":"x y"})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth0","class":"a\nb"})",
+        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth0","refresh":"yes"})",
+        R"({"method":"DEL_GATEWAY_DATA","type":7,"ifname":"eth0","refresh":true})",
+        R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":["eth0"]})",
+        R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth0","slave":1})",
+        R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth0",)"
+        R"("interface_destination":"a|b","interface_source_delete":true})",
+        R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth0"})",
+        R"({"method":"REFRESH_GATEWAY","type":{"a":1}})",
+        R"({"method":false})",
+        R"({"method":"NO_SUCH_METHOD","type":"GTYPE_V4","ifname":"eth1"})",
+        R"([1,2])",
+        R"("ADD_GATEWAY_DATA")",
+    };
+    for (const char* request : requests) {
+        Send(request);
+        EXPECT_EQ(Files(), files) << request;
+    }
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+    // Each unknown type is logged by the add and by the refresh it asked for.
+    EXPECT_EQ(log_.Matching("Unknown type to add info").size(), 4u);
+    EXPECT_TRUE(log_.Contains("Invalid key [priority] in request"));
+    EXPECT_TRUE(log_.Contains("Invalid key [interface_destination] in request"));
+    EXPECT_TRUE(log_.Contains("Missing key [ifname] in request"));
+    EXPECT_TRUE(log_.Contains("Invalid request"));
+
+    Json::Value answer;
+    EXPECT_EQ(module_.GetGatewayListData(Json::Value("GTYPE_V4"), answer), -1);
+    EXPECT_EQ(module_.GetGatewayListData(Json::Value(Json::objectValue), answer), -1);
+    EXPECT_TRUE(log_.Contains("Unknown type to get data"));
+    EXPECT_EQ(module_.WriteGatewayListToFile(static_cast<GATEWAY_TYPE>(-1)), -1);
+    EXPECT_TRUE(log_.Contains("Unknown type to write config"));
+    EXPECT_EQ(module_.DelGatewayInfo(Json::Value(Json::objectValue)), -1);
+    EXPECT_EQ(Files(), files);
+}
+
+TEST_F(RouteModuleTest, RequestsFromTwoThreadsAreSerialised) {
+    auto addMany = [this](const std::string& prefix) {
+        for (int i = 0; i < 20; ++i) {
+            Add("GTYPE_V6", prefix + std::to_string(i), 0, R"(,"dns":"2001:db8::53")");
+        }
+    };
+    std::thread other(addMany, "a");
+    addMany("b");
+    other.join();
+    EXPECT_EQ(module_.GetList(GTYPE_V6).size(), 40u);
+    RouteModule reread;
+    EXPECT_EQ(reread.ReadGatewayListFromFile(GTYPE_V6), 0);
+    EXPECT_EQ(reread.GetList(GTYPE_V6).size(), 40u);
+}
+
+}  // namespace
+}  // namespace module
+}  // namespace network
+}  // namespace vornnetwork
