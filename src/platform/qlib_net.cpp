@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "platform/qlibc_error.h"
+#include "platform/qlibc_file.h"
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "platform/shell_command.h"
@@ -26,6 +27,13 @@ using vornwireless::utils::IsValidInterfaceName;
 
 const char kNetClass[] = "/sys/class/net";
 const char kRcNetwork[] = "/etc/rc.network";
+const char kSettingsFile[] = "/etc/vorninfo.conf";
+
+struct Topology {
+    const char* name;
+    int code;
+};
+constexpr Topology kTopologies[] = {{"router", 3}, {"bridge", 2}, {"client", 1}};
 
 int Fail(int code) {
     QLIBCErrSet(code);
@@ -154,6 +162,23 @@ int NetRoutetableHandler(int action, const char* ifname) {
         return Fail(QLIBC_ERR_INVALID_ARG);
     }
     return LinkEvent(action == 0 ? "route-table-up" : "route-table-down", ifname);
+}
+
+int QLIBNetTopologyGet(int /*flags*/) {
+    char value[32] = {};
+    const int found = QLIBCFileGetKeyValue(kSettingsFile, "net_topology", value, sizeof(value), 0);
+    if (found == 0) {
+        return Fail(QLIBC_ERR_NOT_FOUND);
+    }
+    if (found > 0) {
+        for (const Topology& topology : kTopologies) {
+            if (std::strcmp(value, topology.name) == 0) {
+                return topology.code;
+            }
+        }
+        QLIBCErrSet(QLIBC_ERR_FORMAT);
+    }
+    return -1;
 }
 
 }  // extern "C"

@@ -29,6 +29,12 @@ int QLIBNetIfLinkDownEvent(const char* ifname);
  * IF for action 0 (link up) or 1 (link down). */
 int NetRoutetableHandler(int action, const char* ifname);
 
+/* The network topology, key "net_topology" of "/etc/vorninfo.conf", as a code (flags: 0):
+ * "router" 3, "bridge" 2, "client" 1. Callers act on "above 1" (the appliance serves a local
+ * network) and on 3 (it also runs the DHCP server). -1 when the key is missing
+ * (QLIBC_ERR_NOT_FOUND) or holds any other value (QLIBC_ERR_FORMAT). */
+int QLIBNetTopologyGet(int flags);
+
 /* Every call taking an interface name refuses (-1, QLIBC_ERR_INVALID_ARG) one that is not a valid
  * interface name, before it reaches a path or a program. All return 0 on success. */
 

@@ -24,6 +24,7 @@
 #include "platform/shell_command.h"
 #include "platform/text_file.h"
 #include "utils/interface_name.h"
+#include "utils/log.h"
 
 namespace {
 
@@ -36,6 +37,10 @@ const char kResolvConf[] = "/etc/resolv.conf";
 const char* const kResolverSources[] = {"/etc/iproute2/config/resolv4.conf",
                                         "/etc/iproute2/config/resolv6.conf"};
 const char kIp[] = "/sbin/ip";
+const char kHostDiscovery[] = "/usr/vorn/bin/fhost";
+const char kHostListFile[] = "/tmp/vorncv.list.tmp";
+// The program writes here first, so that readers of the list never see half of it.
+const char kHostListPart[] = "/tmp/vorncv.list.tmp.part";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
 // Bounds on what is read of a routing table and written per event.
 constexpr size_t kMaxRouteLines = 1024;
@@ -374,6 +379,129 @@ int VORNLogSet1(int level, int category, unsigned int code, ...) {
             line += "\t" + EventText(texts[i]);
         }
         return AppendLine(kEventLog, line + "\n") ? 0 : Fail(QLIBC_ERR_FILE_IO);
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+int VORNFHOSTDumpHost(void) {
+    if (QLIBCFileExist(kHostDiscovery) != 1) {
+        VORN_LOG(LOG_ERR, "No host discovery program [%s]", kHostDiscovery);
+        return Fail(QLIBC_ERR_NOT_FOUND);
+    }
+    try {
+        const std::string part = vorn::platform::RootPath(kHostListPart);
+        if (QLIBCExecl(kHostDiscovery, kExecFlags, "--dump", part.c_str(), nullptr) != 0) {
+            QLIBCSysUnlink(kHostListPart);
+            return Fail(QLIBC_ERR_EXEC);
+        }
+        return QLIBCSysRename(kHostListPart, kHostListFile);
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+}  // extern "C"
+
+namespace {
+
+bool IsYes(const QLIBSZHASH* keys, const char* key) {
+    const char* value = QLIBCSzHashGetValue(keys, key);
+    return value != nullptr && strcasecmp(value, "yes") == 0;
+}
+
+// dhclient's "-S": information request only, the addresses come from autoconfiguration.
+bool AsksStatelessDhcp(const char* options) {
+    std::istringstream words(options != nullptr ? options : "");
+    std::string word;
+    while (words >> word) {
+        if (word == "-S") {
+            return true;
+        }
+    }
+    return false;
+}
+
+int IPv6Type(const QLIBSZHASH* keys) {
+    if (!IsYes(keys, "IPV6INIT")) {
+        return VORN_NET_IPV6_TYPE_OFF;
+    }
+    if (IsYes(keys, "IPV6FORWARDING")) {
+        return VORN_NET_IPV6_TYPE_ROUTER;
+    }
+    const char* address = QLIBCSzHashGetValue(keys, "IPV6ADDR");
+    const bool automatic = IsYes(keys, "IPV6_AUTOCONF") || IsYes(keys, "DHCPV6C");
+    return address != nullptr && address[0] != '\0' && !automatic ? VORN_NET_IPV6_TYPE_STATIC
+                                                                  : VORN_NET_IPV6_TYPE_AUTO;
+}
+
+int IPv6Mode(const QLIBSZHASH* keys) {
+    if (!IsYes(keys, "DHCPV6C")) {
+        return VORN_NET_IPV6_MODE_AUTOCONF;
+    }
+    return AsksStatelessDhcp(QLIBCSzHashGetValue(keys, "DHCPV6C_OPTIONS"))
+               ? VORN_NET_IPV6_MODE_OTHER
+               : VORN_NET_IPV6_MODE_MANAGED;
+}
+
+bool IsIPv6Mode(int mode) {
+    return mode == VORN_NET_IPV6_MODE_AUTOCONF || mode == VORN_NET_IPV6_MODE_MANAGED ||
+           mode == VORN_NET_IPV6_MODE_OTHER;
+}
+
+}  // namespace
+
+extern "C" {
+
+int VORNNetIPv6ConfGet(const char* ifname, VORN_NET_IPV6_CONFIG* config) {
+    if (ifname == nullptr || config == nullptr || !IsValidInterfaceName(ifname)) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    try {
+        const Hash keys =
+            ReadKeys(IfcfgPath(ifname), {"IPV6INIT", "IPV6FORWARDING", "IPV6ADDR", "IPV6_AUTOCONF",
+                                         "DHCPV6C", "DHCPV6C_OPTIONS"});
+        if (keys == nullptr) {
+            return -1;
+        }
+        config->type = IPv6Type(keys.get());
+        config->mode = IPv6Mode(keys.get());
+        return 0;
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+int VORNNetIPv6ConfSet(int mode, const char* ifname, int reserved1, int reserved2, int reserved3) {
+    (void)reserved1;
+    (void)reserved2;
+    (void)reserved3;
+    if (ifname == nullptr || !IsValidInterfaceName(ifname) || !IsIPv6Mode(mode)) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    try {
+        const std::string file = IfcfgPath(ifname);
+        if (QLIBCFileExist(file.c_str()) != 1) {
+            return Fail(QLIBC_ERR_NOT_FOUND);
+        }
+        const Hash set(QLIBCSzHashAlloc(3));
+        const Hash remove(QLIBCSzHashAlloc(1));
+        if (set == nullptr || remove == nullptr) {
+            return Fail(QLIBC_ERR_NO_MEMORY);
+        }
+        QLIBCSzHashSetValue(set.get(), "IPV6_AUTOCONF",
+                            mode == VORN_NET_IPV6_MODE_MANAGED ? "no" : "yes");
+        QLIBCSzHashSetValue(set.get(), "DHCPV6C",
+                            mode == VORN_NET_IPV6_MODE_AUTOCONF ? "no" : "yes");
+        if (mode == VORN_NET_IPV6_MODE_OTHER) {
+            QLIBCSzHashSetValue(set.get(), "DHCPV6C_OPTIONS", "-S");
+        } else {
+            QLIBCSzHashSetValue(remove.get(), "DHCPV6C_OPTIONS", "");
+        }
+        if (QLIBCFileSetKeys(file.c_str(), set.get(), remove.get(), 0) != 0) {
+            return -1;
+        }
+        return QLIBCExecl("/etc/rc.network", kExecFlags, "ipv6-restart", ifname, nullptr);
     } catch (const std::exception&) {
         return Fail(QLIBC_ERR_NO_MEMORY);
     }

@@ -48,6 +48,43 @@ int VORNNetDNSUpdate(void);
  * the event code in hex (0x%08X) and the text arguments (a null pointer ends them). 0 or -1. */
 int VORNLogSet1(int level, int category, unsigned int code, ...);
 
+/* Host discovery of appliances of the system's family: runs the platform's discovery program
+ * "/usr/vorn/bin/fhost" with "--dump" and a file to write, waits for it and renames the file to
+ * "/tmp/vorncv.list.tmp", so the list there is always whole. The program writes one line per host
+ * found ("model,model name,name,IPv4,MAC"). 0; -1 when the program is missing (logged,
+ * QLIBC_ERR_NOT_FOUND), does not exit with 0 (QLIBC_ERR_EXEC) or the rename fails. */
+int VORNFHOSTDumpHost(void);
+
+/* IPv6 settings of an interface, kept in its "/etc/sysconfig/network-scripts/ifcfg-IF" file
+ * with the initscripts keys IPV6INIT, IPV6FORWARDING, IPV6ADDR, IPV6_AUTOCONF, DHCPV6C and
+ * DHCPV6C_OPTIONS ("yes" compared without regard to case). */
+enum {
+    VORN_NET_IPV6_TYPE_OFF = 0,    /* IPV6INIT is not "yes" */
+    VORN_NET_IPV6_TYPE_ROUTER = 1, /* IPV6FORWARDING=yes: the system routes on it itself */
+    VORN_NET_IPV6_TYPE_AUTO = 2,   /* addresses from router advertisements (and DHCPv6) */
+    VORN_NET_IPV6_TYPE_STATIC = 3  /* IPV6ADDR, with neither IPV6_AUTOCONF nor DHCPV6C "yes" */
+};
+/* How an automatically configured interface gets its addresses. */
+enum {
+    VORN_NET_IPV6_MODE_AUTOCONF = 0, /* IPV6_AUTOCONF=yes, DHCPV6C=no */
+    VORN_NET_IPV6_MODE_MANAGED = 2,  /* stateful DHCPv6: IPV6_AUTOCONF=no, DHCPV6C=yes */
+    VORN_NET_IPV6_MODE_OTHER = 4     /* stateless DHCPv6 too: IPV6_AUTOCONF=yes, DHCPV6C=yes,
+                                        DHCPV6C_OPTIONS=-S */
+};
+typedef struct VORN_NET_IPV6_CONFIG {
+    int type; /* VORN_NET_IPV6_TYPE_* */
+    int mode; /* VORN_NET_IPV6_MODE_*: MANAGED when DHCPV6C=yes (OTHER with a "-S" word in
+                 DHCPV6C_OPTIONS), else AUTOCONF */
+} VORN_NET_IPV6_CONFIG;
+
+/* Reads the interface's IPv6 settings. 0, or -1 when the file cannot be read or the name is bad. */
+int VORNNetIPv6ConfGet(const char* ifname, VORN_NET_IPV6_CONFIG* config);
+/* Writes the keys of mode (a VORN_NET_IPV6_MODE_* value; other keys kept) into the interface's
+ * existing ifcfg file and applies them by running "/etc/rc.network" "ipv6-restart" IF. The three
+ * int arguments are reserved: pass 0. 0, or -1 for a bad mode or name, a missing file, a failed
+ * write or a failed restart. */
+int VORNNetIPv6ConfSet(int mode, const char* ifname, int reserved1, int reserved2, int reserved3);
+
 #ifdef __cplusplus
 }
 #endif

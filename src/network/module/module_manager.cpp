@@ -1,5 +1,7 @@
 #include "network/module/module_manager.h"
 
+#include "network/module/devicelist_module.h"
+#include "network/module/ipv6_module.h"
 #include "network/module/netlink_module.h"
 #include "network/module/route_module.h"
 #include "network/module/test_module.h"
@@ -8,19 +10,13 @@
 namespace vornnetwork {
 namespace network {
 namespace module {
-namespace {
-
-// The rows of modules that are not part of this build yet create nothing.
-BaseModule* NotBuiltYet() {
-    return nullptr;
-}
-
-}  // namespace
 
 const ModuleManager::MODULE_INFO ModuleManager::module_info[5] = {
-    {MODULE_TEST, false, &TestModule::Create}, {MODULE_NETLINK, true, &NetlinkModule::Create},
-    {MODULE_IPV6, true, &NotBuiltYet},         {MODULE_ROUTE, true, &RouteModule::Create},
-    {MODULE_DEVICE_LIST, true, &NotBuiltYet},
+    {MODULE_TEST, false, &TestModule::Create},
+    {MODULE_NETLINK, true, &NetlinkModule::Create},
+    {MODULE_IPV6, true, &IPv6Module::Create},
+    {MODULE_ROUTE, true, &RouteModule::Create},
+    {MODULE_DEVICE_LIST, true, &DeviceListModule::Create},
 };
 
 ModuleManager* ModuleManager::GetInstance() {

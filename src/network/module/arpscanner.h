@@ -1,0 +1,49 @@
+#ifndef VORN_NETWORK_MODULE_ARPSCANNER_H
+#define VORN_NETWORK_MODULE_ARPSCANNER_H
+
+#include <pthread.h>
+
+#include <atomic>
+#include <string>
+
+#include "network/module/clientlist.h"
+
+namespace vornnetwork {
+namespace network {
+namespace module {
+
+// Clients of the local bridges from the kernel's ARP table, named from the DHCP server's leases
+// or by NetBIOS. A scan runs on a detached thread, one at a time.
+class ArpScanner : public ClientList {
+  public:
+    static ArpScanner* Inst();
+
+    // Starts a scan when none runs and returns the list as it is now: the result of a scan is
+    // seen by a later call.
+    Json::Value GetData();
+    int Start() { return 0; }
+    int Stop() { return 0; }
+    // Whether a scan thread is still at work.
+    static bool IsScanning() { return scanning_; }
+
+    void UpdateArpTabe();
+    int GetArpTable();
+    // One line of "arp -a": "host (ip) at mac [ether] on ifname".
+    int AppendClientList(const std::string& line);
+    int GetDHCPInfoByMAC(const std::string& mac, std::string& name);
+    int GetNmbInfoByIP(const std::string& ip, std::string& name);
+    static void* WaitProcessFinish(void*);
+
+  private:
+    ArpScanner() = default;
+
+    int topology = 0;
+    pthread_t thread = {};
+    static std::atomic<bool> scanning_;
+};
+
+}  // namespace module
+}  // namespace network
+}  // namespace vornnetwork
+
+#endif

@@ -1,0 +1,160 @@
+#include "network/module/arpscanner.h"
+
+#include <gmock/gmock.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <string>
+#include <thread>
+
+#include "platform/qlib_net.h"
+#include "platform/qlibc_error.h"
+#include "support/sim_root.h"
+
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using vornnetwork::network::module::ArpScanner;
+
+const char kArpTable[] =
+    "when -a\n"
+    "print ? (192.168.1.10) at aa:bb:cc:00:00:01 [ether] on br0\n"
+    "print laptop (192.168.1.11) at aa:bb:cc:00:00:02 [ether] on br0\n"
+    "print ? (10.0.0.1) at aa:bb:cc:00:00:03 [ether] on eth0\n"
+    "print ? (192.168.1.12) at aa:bb:cc:00:00:04 [ether] on lbr0\n"
+    "print ? (192.168.1.13) at <incomplete> on br0\n";
+
+class ArpScannerTest : public vorn::test::RootTest {
+  protected:
+    void SetUp() override {
+        root_.Scenario("nmblookup",
+                       "when -A 192.168.1.12\n"
+                       "print Looking up status of 192.168.1.12\n"
+                       "print \tWORKGROUP       <00> - <GROUP> B <ACTIVE>\n"
+                       "print \tPRINTER01       <00> -         B <ACTIVE>\n"
+                       "print \tPRINTER01       <20> -         B <ACTIVE>\n");
+        root_.WriteFile("/etc/dhcpd/dhcpd.conf.leases",
+                        "1700000000 aa:bb:cc:00:00:01 192.168.1.10 nas-box 01:aa\n"
+                        "1700000000 aa:bb:cc:00:00:04 192.168.1.12 * *\n");
+        scanner_->EraseList();
+    }
+    void TearDown() override { WaitForScan(); }
+
+    void SetTopology(const char* topology) {
+        root_.WriteFile("/etc/vorninfo.conf", std::string("net_topology=\"") + topology + "\"\n");
+    }
+    static void WaitForScan() {
+        for (int i = 0; i < 1000 && ArpScanner::IsScanning(); ++i) {
+            std::this_thread::sleep_for(std::chrono::milliseconds(10));
+        }
+        ASSERT_FALSE(ArpScanner::IsScanning());
+    }
+    Json::Value Client(unsigned index) { return scanner_->GetClientList()["ClientList"][index]; }
+
+    ArpScanner* scanner_ = ArpScanner::Inst();
+};
+
+TEST_F(ArpScannerTest, TopologyCodes) {
+    const std::pair<const char*, int> codes[] = {{"router", 3}, {"bridge", 2}, {"client", 1}};
+    for (const auto& code : codes) {
+        SetTopology(code.first);
+        EXPECT_EQ(QLIBNetTopologyGet(0), code.second) << code.first;
+    }
+    SetTopology("mesh");
+    EXPECT_EQ(QLIBNetTopologyGet(0), -1);
+    EXPECT_EQ(QLIBCErrGet(), QLIBC_ERR_FORMAT);
+    root_.WriteFile("/etc/vorninfo.conf", "dns_mode=\"auto\"\n");
+    EXPECT_EQ(QLIBNetTopologyGet(0), -1);
+    EXPECT_EQ(QLIBCErrGet(), QLIBC_ERR_NOT_FOUND);
+}
+
+TEST_F(ArpScannerTest, RouterListsBridgeClientsNamedByLeaseOrNetbios) {
+    SetTopology("router");
+    root_.Scenario("arp", kArpTable);
+    ASSERT_EQ(scanner_->GetArpTable(), 0);
+    const Json::Value clients = scanner_->GetClientList()["ClientList"];
+    ASSERT_EQ(clients.size(), 3u);
+    EXPECT_EQ(clients[0]["friendlyName"], "nas-box");
+    EXPECT_EQ(clients[0]["ipAddr"], "192.168.1.10");
+    EXPECT_EQ(clients[0]["netif"], "br0");
+    EXPECT_EQ(clients[0]["macAddr"], "aa:bb:cc:00:00:01");
+    EXPECT_EQ(clients[1]["friendlyName"], "laptop");  // no lease: the ARP name stays
+    EXPECT_EQ(clients[2]["friendlyName"], "PRINTER01");
+    EXPECT_EQ(clients[2]["netif"], "lbr0");
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/arp -a", "/usr/vorn/bin/nmblookup -A 192.168.1.12"));
+}
+
+TEST_F(ArpScannerTest, BridgeTopologyAsksNetbiosOnlyAndClientTopologyNothing) {
+    SetTopology("bridge");
+    root_.Scenario("arp", kArpTable);
+    ASSERT_EQ(scanner_->GetArpTable(), 0);
+    EXPECT_FALSE(Client(0).isMember("friendlyName"));
+    EXPECT_EQ(Client(0)["displayName"], "General DMA");
+    EXPECT_EQ(Client(1)["friendlyName"], "laptop");
+    EXPECT_EQ(Client(2)["friendlyName"], "PRINTER01");
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/arp -a", "/usr/vorn/bin/nmblookup -A 192.168.1.10",
+                            "/usr/vorn/bin/nmblookup -A 192.168.1.12"));
+
+    root_.ClearCalls();
+    scanner_->EraseList();
+    SetTopology("client");
+    ASSERT_EQ(scanner_->GetArpTable(), 0);
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+    EXPECT_TRUE(scanner_->GetClientList()["ClientList"].empty());
+}
+
+TEST_F(ArpScannerTest, HostileLinesAreSkippedBeforeAnyCommand) {
+    SetTopology("bridge");
+    ASSERT_EQ(scanner_->GetArpTable(), 0);  // sets the topology; the table is empty
+    root_.ClearCalls();
+    for (const char* line : {"? (192.168.1.20) at $(reboot) [ether] on br0",
+                             "? (192.168.1.21;reboot) at aa:bb:cc:00:00:21 [ether] on br0",
+                             "? (192.168.1.999) at aa:bb:cc:00:00:22 [ether] on br0",
+                             "? (192.168.1.23) at aa:bb:cc:00:00:23 [ether] on br0;reboot"}) {
+        EXPECT_EQ(scanner_->AppendClientList(line), -1) << line;
+    }
+    EXPECT_EQ(scanner_->AppendClientList("? (10.0.0.1) at $(reboot) [ether] on eth0"), 0);
+    EXPECT_EQ(scanner_->AppendClientList(""), 0);
+    std::string name = "kept";
+    EXPECT_EQ(scanner_->GetNmbInfoByIP("1.2.3.4 ; reboot", name), -1);
+    EXPECT_EQ(name, "kept");
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+    EXPECT_TRUE(scanner_->GetClientList()["ClientList"].empty());
+
+    root_.Scenario("arp", "when -a\nprint " + std::string(5000, 'x') +
+                              " (192.168.1.30) at aa:bb:cc:00:00:30 [ether] on br0\n"
+                              "print ? (192.168.1.31) at aa:bb:cc:00:00:31 [ether] on br0\n");
+    ASSERT_EQ(scanner_->GetArpTable(), 0);
+    ASSERT_EQ(scanner_->GetClientList()["ClientList"].size(), 1u);
+    EXPECT_EQ(Client(0)["ipAddr"], "192.168.1.31");
+
+    root_.WriteFile("/etc/dhcpd/dhcpd.conf.leases", "");
+    EXPECT_EQ(scanner_->GetDHCPInfoByMAC("aa:bb:cc:00:00:31", name), 0);
+    EXPECT_EQ(name, "kept");
+    ASSERT_EQ(unlink(root_.Path("/etc/dhcpd/dhcpd.conf.leases").c_str()), 0);
+    EXPECT_EQ(scanner_->GetDHCPInfoByMAC("aa:bb:cc:00:00:31", name), -1);
+    EXPECT_TRUE(log_.Contains("arpscanner.cpp:"));
+    EXPECT_TRUE(log_.Contains("Failed to open dhcp leases file"));
+}
+
+TEST_F(ArpScannerTest, GetDataStartsOneScanWhoseResultALaterCallSees) {
+    SetTopology("router");
+    root_.Scenario("arp", kArpTable);
+    Json::Value stale;
+    stale["netif"] = "br9";
+    scanner_->UpdateKeysByMac("aa:bb:cc:00:00:99", stale, true);
+    scanner_->GetData();
+    WaitForScan();
+    EXPECT_EQ(scanner_->GetClientList()["ClientList"].size(), 3u);  // emptied, then filled
+    EXPECT_EQ(root_.Calls().front(), "/sbin/arp -a");
+
+    const Json::Value seen = scanner_->GetData();  // starts the next scan
+    WaitForScan();
+    EXPECT_LE(seen["ClientList"].size(), 3u);
+    EXPECT_EQ(scanner_->GetClientList()["ClientList"].size(), 3u);
+}
+
+}  // namespace

@@ -1,0 +1,52 @@
+#ifndef VORN_NETWORK_MODULE_CLIENTLIST_H
+#define VORN_NETWORK_MODULE_CLIENTLIST_H
+
+#include <json/json.h>
+#include <pthread.h>
+
+#include <string>
+
+namespace vornnetwork {
+namespace network {
+namespace module {
+
+// A locked JSON list of the clients of the local network, {"ClientList": [ {...}, ... ]}, keyed
+// by MAC or IP address. Base of the four scanners and the device list's merged list.
+class ClientList {
+  public:
+    ClientList();
+    virtual ~ClientList();
+    ClientList(const ClientList&) = delete;
+    ClientList& operator=(const ClientList&) = delete;
+
+    // Merge obj into the entry of that MAC (IP); with add, a client not yet listed is appended.
+    bool UpdateKeysByMac(const std::string& mac, const Json::Value& obj, const bool& add);
+    bool UpdateKeysByIP(const std::string& ip, const Json::Value& obj, const bool& add);
+
+    bool VerifyMacIsExist(const std::string& mac, unsigned& index);
+    bool VerifyIPIsExist(const std::string& ip, unsigned& index);
+    std::string FindMacByIP(const std::string& ip);
+    std::string FindKey(const std::string& mac, const std::string& key);
+    bool GetObject(const std::string& mac, Json::Value& out);
+
+    void EraseList();
+    bool EraseObject(const std::string& mac);
+    Json::Value GetClientList();
+
+    bool WriteToFile(const std::string& path);
+    bool LoadClientList(const std::string& path);
+    bool Load(const std::string& path) { return LoadClientList(path); }
+
+    void DetermineDisplayName(const Json::Value& obj, std::string& name);
+    std::string GetLocalTime();
+
+  protected:
+    pthread_mutex_t mutex;
+    Json::Value root;
+};
+
+}  // namespace module
+}  // namespace network
+}  // namespace vornnetwork
+
+#endif

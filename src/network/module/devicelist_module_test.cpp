@@ -1,0 +1,267 @@
+#include "network/module/devicelist_module.h"
+
+#include <gmock/gmock.h>
+
+#include <filesystem>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "support/sim_root.h"
+#include "utils/json_text.h"
+
+namespace vornnetwork {
+namespace network {
+namespace module {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+constexpr char kDir[] = "/var/packages/Linkyard/target/data/";
+constexpr char kFile[] = "/var/packages/Linkyard/target/data//connectionlist_upnpscanner.json";
+
+Json::Value Parse(const std::string& text) {
+    Json::Value value;
+    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
+    return value;
+}
+
+// The scanners' lists are the test's own; each asked scanner is recorded.
+class ListedModule : public DeviceListModule {
+  public:
+    int GetArpScannerData(Json::Value& out) override { return Give("arp", out); }
+    int GetUpnpScannerData(Json::Value& out) override { return Give("upnp", out); }
+    int GetCVScannerData(Json::Value& out) override { return Give("cv", out); }
+    int GetWifiScannerData(Json::Value& out) override { return Give("wifi", out); }
+
+    std::map<std::string, std::string> lists;  // scanner -> JSON array text; absent: fails
+    std::vector<std::string> asked;
+
+  private:
+    int Give(const std::string& scanner, Json::Value& out) {
+        asked.push_back(scanner);
+        const auto found = lists.find(scanner);
+        if (found == lists.end()) {
+            return -1;
+        }
+        out["ClientList"] = Parse(found->second);
+        return 0;
+    }
+};
+
+class DeviceListModuleTest : public vorn::test::RootTest {
+  protected:
+    void SetUp() override {
+        std::filesystem::create_directories(root_.Path(kDir));
+        module_.lists = {{"arp", "[]"}, {"upnp", "[]"}, {"cv", "[]"}, {"wifi", "[]"}};
+    }
+    int Send(const std::string& text, Json::Value* answer = nullptr) {
+        Json::Value ignored;
+        return module_.ProcessRequest(Parse(text), answer != nullptr ? *answer : ignored);
+    }
+    // The merged list after a "get" "all" with nothing new from the scanners.
+    Json::Value All() {
+        Json::Value answer;
+        EXPECT_EQ(Send(R"({"method":"get","scannertype":"all"})", &answer), 0);
+        return answer["ClientList"];
+    }
+    static std::vector<std::string> Column(const Json::Value& list, const char* key) {
+        std::vector<std::string> values;
+        for (const Json::Value& client : list) {
+            values.push_back(client[key].asString());
+        }
+        return values;
+    }
+
+    ListedModule module_;
+};
+
+TEST_F(DeviceListModuleTest, ArpAndWifiAddWhileUpnpAndCvOnlyDescribe) {
+    module_.lists["arp"] = R"([
+        {"macAddr":"aa:00:00:00:00:01","ipAddr":"10.0.0.2","netif":"br0","friendlyName":"laptop"},
+        {"macAddr":"aa:00:00:00:00:02","ipAddr":"10.0.0.3","netif":"br0"}])";
+    module_.lists["upnp"] = R"([
+        {"ipAddr":"10.0.0.3","friendlyName":"TV","modelName":"Bravia","manufacturer":"Sony"},
+        {"ipAddr":"10.0.0.9","friendlyName":"seen only by upnp"}])";
+    module_.lists["cv"] = R"([
+        {"macAddr":"aa:00:00:00:00:01","deviceType":"nas","manufacturer":"Tessarin"},
+        {"macAddr":"aa:00:00:00:00:07","friendlyName":"seen only by cv"}])";
+    module_.lists["wifi"] = R"([
+        {"macAddr":"aa:00:00:00:00:04","connection":"wifi","netif":"wlan0","signalstrength":80},
+        {"macAddr":"aa:00:00:00:00:02","connection":"wifi","netif":"wlan0"}])";
+
+    const Json::Value list = All();
+    EXPECT_THAT(module_.asked, ElementsAre("arp", "upnp", "cv", "wifi"));
+    EXPECT_THAT(Column(list, "macAddr"),
+                ElementsAre("aa:00:00:00:00:01", "aa:00:00:00:00:02", "aa:00:00:00:00:04"));
+    EXPECT_THAT(Column(list, "displayName"), ElementsAre("laptop", "TV", "General DMA"));
+    EXPECT_THAT(Column(list, "manufacturer"), ElementsAre("Tessarin", "Sony", ""));
+    // Wifi comes after ARP: the station's interface wins, ARP's address stays.
+    EXPECT_EQ(list[1]["netif"], "wlan0");
+    EXPECT_EQ(list[1]["ipAddr"], "10.0.0.3");
+    EXPECT_EQ(list[2]["signalstrength"], 80);
+    EXPECT_FALSE(list[0]["asso_time"].asString().empty());
+    // What was answered is what was saved.
+    EXPECT_EQ(Parse(root_.ReadFile(kFile))["ClientList"], list);
+
+    // A later CV name outranks the UPnP one on the same client; nobody is added twice.
+    module_.lists["cv"] = R"([{"macAddr":"aa:00:00:00:00:02","friendlyName":"NAS"}])";
+    EXPECT_THAT(Column(All(), "displayName"), ElementsAre("laptop", "NAS", "General DMA"));
+}
+
+TEST_F(DeviceListModuleTest, AFailingStepStopsTheMergeBeforeLaterScannersAndTheFile) {
+    module_.lists["arp"] = R"([{"macAddr":"aa:00:00:00:00:01","ipAddr":"10.0.0.2"}])";
+    module_.lists.erase("upnp");
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"all"})"), -1);
+    EXPECT_THAT(module_.asked, ElementsAre("arp", "upnp"));
+    EXPECT_TRUE(log_.Contains("devicelist_module.cpp:"));
+    EXPECT_TRUE(log_.Contains(" cannot get upnp data"));
+    EXPECT_TRUE(log_.Contains(" failed to get all list data"));
+    EXPECT_TRUE(log_.Contains(" failed to get data by scannertype"));
+    EXPECT_FALSE(root_.Exists(kFile));
+
+    // The wifi step reports with the CV text.
+    module_.lists["upnp"] = "[]";
+    module_.lists.erase("wifi");
+    log_.Clear();
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"all"})"), -1);
+    EXPECT_TRUE(log_.Contains(" cannot get cv data"));
+
+    // An element with neither MAC nor IP ends that list's merge: what follows it is not merged.
+    module_.lists["wifi"] = R"([{"macAddr":"aa:00:00:00:00:05"},{"netif":"wlan0"},
+                                {"macAddr":"aa:00:00:00:00:06"}])";
+    log_.Clear();
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"all"})"), -1);
+    EXPECT_TRUE(log_.Contains(" cannot get ip or mac from list object"));
+    EXPECT_TRUE(log_.Contains(" cannot merge list from wifi data"));
+    module_.lists["wifi"] = "[]";
+    EXPECT_THAT(Column(All(), "macAddr"), ElementsAre("aa:00:00:00:00:01", "aa:00:00:00:00:05"));
+
+    EXPECT_EQ(module_.MergeList(Parse(R"({"ClientList":{}})"), true), -1);
+    EXPECT_TRUE(log_.Contains(" wrong format of input list"));
+}
+
+TEST_F(DeviceListModuleTest, SingleScannerRequestsAnswerThatScannersList) {
+    module_.lists["cv"] = R"([{"macAddr":"aa:00:00:00:00:09","modelName":"TS-9"}])";
+    Json::Value answer;
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"cv"})", &answer), 0);
+    EXPECT_EQ(answer["ClientList"][0]["modelName"], "TS-9");
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"wifi"})", &answer), 0);
+    EXPECT_THAT(module_.asked, ElementsAre("cv", "wifi"));
+
+    module_.lists.erase("cv");
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"cv"})"), -1);
+    EXPECT_TRUE(log_.Contains(" failed to get upnp data"));
+    // "arp" is not one of the request's names.
+    EXPECT_EQ(Send(R"({"method":"get","scannertype":"arp"})"), -1);
+    EXPECT_TRUE(log_.Contains(" unknown type from input (arp)"));
+    // Nothing was merged by any of it.
+    module_.lists["cv"] = "[]";
+    EXPECT_THAT(All(), IsEmpty());
+}
+
+TEST_F(DeviceListModuleTest, SetNamesAKnownClientAndDelDropsIt) {
+    module_.lists["arp"] = R"([
+        {"macAddr":"aa:00:00:00:00:01","ipAddr":"10.0.0.2","friendlyName":"laptop"},
+        {"macAddr":"aa:00:00:00:00:02","ipAddr":"10.0.0.3"}])";
+    All();
+    const std::string saved = root_.ReadFile(kFile);
+    module_.lists["arp"] = "[]";
+
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"aa:00:00:00:00:02",)"
+                   R"("userdef_displayName":"Printer","userdef_deviceType":"printer"})"),
+              0);
+    EXPECT_EQ(root_.ReadFile(kFile), saved);  // saved at the next "all" only
+    Json::Value list = All();
+    EXPECT_EQ(list[1]["userdef_displayName"], "Printer");
+    EXPECT_EQ(list[1]["userdef_deviceType"], "printer");
+    EXPECT_EQ(list[1]["displayName"], "General DMA");
+    EXPECT_EQ(Parse(root_.ReadFile(kFile))["ClientList"][1]["userdef_deviceType"], "printer");
+
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"AA:00:00:00:00:02",)"
+                   R"("userdef_displayName":"x","userdef_deviceType":"y"})"),
+              -1);
+    EXPECT_TRUE(log_.Contains(" failed to get object (AA:00:00:00:00:02) from list"));
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"aa:00:00:00:00:02",)"
+                   R"("userdef_displayName":"x","userdef_deviceType":""})"),
+              -1);
+    EXPECT_TRUE(log_.Contains(" input string should not be empty"));
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"aa:00:00:00:00:02","userdef_displayName":"x"})"),
+              -1);
+    EXPECT_TRUE(log_.Contains(" indata has no member (userdef_deviceType) or wrong format"));
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"aa:00:00:00:00:02",)"
+                   R"("userdef_displayName":7,"userdef_deviceType":"y"})"),
+              -1);
+    EXPECT_TRUE(log_.Contains(" indata has no member (userdef_displayName) or wrong format"));
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"aa:00:00:00:00:02","userdef_displayName":")" +
+                   std::string(257, 'n') + R"(","userdef_deviceType":"y"})"),
+              -1);
+    EXPECT_EQ(All()[1]["userdef_displayName"], "Printer");
+
+    // An unknown MAC fails and leaves the list usable.
+    EXPECT_EQ(Send(R"({"method":"del","macAddr":"aa:00:00:00:00:09"})"), -1);
+    EXPECT_TRUE(log_.Contains(" failed to erase object (aa:00:00:00:00:09) from list"));
+    EXPECT_EQ(Send(R"({"method":"del","macAddr":""})"), -1);
+    EXPECT_TRUE(log_.Contains(" input mac should not be empty"));
+    EXPECT_EQ(Send(R"({"method":"del","macAddr":"aa:00:00:00:00:01"})"), 0);
+    EXPECT_THAT(Column(All(), "macAddr"), ElementsAre("aa:00:00:00:00:02"));
+}
+
+TEST_F(DeviceListModuleTest, TheListIsLoadedAtStartAndSavedAtTermination) {
+    root_.WriteFile(kFile, R"({"ClientList":[{"macAddr":"aa:00:00:00:00:03","ipAddr":"10.0.0.4",
+        "userdef_displayName":"Kitchen","displayName":"General DMA"}]})");
+    ASSERT_EQ(module_.Initialize(), 0);
+    EXPECT_EQ(All()[0]["userdef_displayName"], "Kitchen");
+    EXPECT_EQ(Send(R"({"method":"set","macAddr":"aa:00:00:00:00:03",)"
+                   R"("userdef_displayName":"Hall","userdef_deviceType":"tv"})"),
+              0);
+    EXPECT_EQ(module_.Terminate(), 0);
+    EXPECT_EQ(Parse(root_.ReadFile(kFile))["ClientList"][0]["userdef_displayName"], "Hall");
+
+    // Without the data folder nothing is written and nothing fails.
+    std::filesystem::remove_all(root_.Path(kDir));
+    EXPECT_EQ(module_.Terminate(), 0);
+    EXPECT_FALSE(root_.Exists(kFile));
+    EXPECT_FALSE(log_.Contains("when terminate"));
+
+    // A damaged file is skipped: the module starts empty.
+    root_.WriteFile(kFile, R"({"ClientList":[{"macAddr":)");
+    ListedModule fresh;
+    fresh.lists = module_.lists;
+    ASSERT_EQ(fresh.Initialize(), 0);
+    EXPECT_TRUE(
+        log_.Contains(" failed to read (" + std::string(kFile) + ") to client list, skip it"));
+    Json::Value answer;
+    EXPECT_EQ(fresh.ProcessRequest(Parse(R"({"method":"get","scannertype":"all"})"), answer), 0);
+    EXPECT_THAT(answer["ClientList"], IsEmpty());
+}
+
+TEST_F(DeviceListModuleTest, MalformedRequestsAreRefusedAndChangeNothing) {
+    module_.lists["arp"] = R"([{"macAddr":"aa:00:00:00:00:01","ipAddr":"10.0.0.2"}])";
+    All();
+    module_.lists["arp"] = "[]";
+    const std::string saved = root_.ReadFile(kFile);
+
+    for (const char* request :
+         {R"([1,2])", R"("get")", R"({})", R"({"method":3})",
+          R"({"method":"get","scannertype":["all"]})", R"({"method":"set","macAddr":{"a":1}})",
+          R"({"method":"del","macAddr":null})"}) {
+        EXPECT_EQ(Send(request), -1) << request;
+    }
+    EXPECT_EQ(log_.Matching(" indata has no member (method) or wrong format").size(), 4u);
+    EXPECT_TRUE(log_.Contains(" indata has no member (scannertype) or wrong format"));
+    EXPECT_EQ(log_.Matching(" indata has no member (macAddr) or wrong format").size(), 2u);
+    EXPECT_EQ(Send(R"({"method":"put"})"), -1);
+    EXPECT_TRUE(log_.Contains(" unknown type from input (put)"));
+    EXPECT_TRUE(log_.Contains(" failed to set data"));
+    EXPECT_TRUE(log_.Contains(" failed to del data"));
+
+    EXPECT_EQ(root_.ReadFile(kFile), saved);
+    EXPECT_THAT(Column(All(), "macAddr"), ElementsAre("aa:00:00:00:00:01"));
+}
+
+}  // namespace
+}  // namespace module
+}  // namespace network
+}  // namespace vornnetwork

@@ -1,0 +1,319 @@
+#include "network/module/ipv6_module.h"
+
+#include <arpa/inet.h>
+#include <gmock/gmock.h>
+#include <net/if.h>
+
+#include <cstdint>
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "network/module/module_manager.h"
+#include "network/module/route_module.h"
+#include "platform/vorn_net.h"
+#include "support/sim_root.h"
+#include "utils/json_text.h"
+
+namespace vornnetwork {
+namespace network {
+namespace module {
+namespace {
+
+using ::testing::AllOf;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using Bytes = std::vector<unsigned char>;
+
+const std::string kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-";
+constexpr char kAutoconf[] = "IPV6INIT=yes\nIPV6_AUTOCONF=yes\n";
+constexpr std::uint8_t kManaged = 0x80;
+constexpr std::uint8_t kOther = 0x40;
+
+Bytes PrefixOption(const char* prefix, unsigned char units = 4) {
+    Bytes option(units * 8u, 0);
+    option[0] = 3;
+    option[1] = units;
+    if (option.size() >= 32) {
+        option[2] = 64;
+        inet_pton(AF_INET6, prefix, &option[16]);
+    }
+    return option;
+}
+
+// A router advertisement with a source link-layer address option and then the given options.
+Bytes Advert(std::uint8_t flags, const std::vector<Bytes>& options) {
+    Bytes packet = {134, 0, 0, 0, 64, flags, 0x07, 0x08, 0, 0, 0, 0,
+                    0,   0, 0, 0, 1,  1,     2,    0,    0, 0, 0, 1};
+    for (const Bytes& option : options) {
+        packet.insert(packet.end(), option.begin(), option.end());
+    }
+    return packet;
+}
+
+class IPv6ModuleTest : public vorn::test::RootTest {
+  protected:
+    void SetUp() override {
+        manager_->RemoveModule(MODULE_ROUTE);
+        ASSERT_TRUE(manager_->AddModule({MODULE_ROUTE, true, &RouteModule::Create}));
+    }
+    void TearDown() override { manager_->RemoveModule(MODULE_ROUTE); }
+
+    // The calls of the programs the module drives, then a fresh call log.
+    std::vector<std::string> TakeCalls() {
+        std::vector<std::string> calls;
+        for (const std::string& call : root_.Calls()) {
+            if (call.find("route show") == std::string::npos) {
+                calls.push_back(call);
+            }
+        }
+        root_.ClearCalls();
+        return calls;
+    }
+    InterfaceContext Context(const std::string& ifname) const {
+        return module_.GetContexts()[ifname];
+    }
+    void Receive(const Bytes& packet, const char* sender = "fe80::1",
+                 unsigned int index = if_nametoindex("lo")) {
+        sockaddr_in6 from{};
+        from.sin6_family = AF_INET6;
+        inet_pton(AF_INET6, sender, &from.sin6_addr);
+        in6_pktinfo info{};
+        info.ipi6_ifindex = index;
+        // An exact-size copy, so that a read past the end trips the address sanitizer.
+        const Bytes exact(packet);
+        module_.HandlePacket(exact.data(), static_cast<int>(exact.size()), from, info);
+    }
+
+    ModuleManager* manager_ = ModuleManager::GetInstance();
+    IPv6Module module_;
+};
+
+TEST_F(IPv6ModuleTest, AppliesEachChangeOnce) {
+    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
+    EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::1 dev eth0",
+                                         "/etc/rc.network ipv6-restart eth0"));
+    EXPECT_THAT(root_.ReadFile("/etc/iproute2/config/gateway_v6_priority"),
+                AllOf(HasSubstr("gateway=fe80::1"), HasSubstr("ifname=eth0")));
+    EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
+                AllOf(HasSubstr("IPV6_AUTOCONF=yes\n"), HasSubstr("DHCPV6C=no\n")));
+    EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_AUTOCONF);
+
+    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
+    EXPECT_THAT(TakeCalls(), IsEmpty());
+
+    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, true);
+    EXPECT_THAT(TakeCalls(), ElementsAre(HasSubstr("route add"), HasSubstr("ipv6-restart eth0")));
+    EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
+                AllOf(HasSubstr("IPV6_AUTOCONF=yes\n"), HasSubstr("DHCPV6C=yes\n"),
+                      HasSubstr("DHCPV6C_OPTIONS=-S\n")));
+    VORN_NET_IPV6_CONFIG config;
+    ASSERT_EQ(VORNNetIPv6ConfGet("eth0", &config), 0);
+    EXPECT_EQ(config.type, VORN_NET_IPV6_TYPE_AUTO);
+    EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_OTHER);
+
+    // A new prefix applies again, even with the same flags.
+    module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", false, true);
+    EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::2 dev eth0",
+                                         "/etc/rc.network ipv6-restart eth0"));
+
+    Json::Value answer;
+    Json::Value reset;
+    reset["method"] = "RESET_IPV6_MODULE";
+    reset["ifname"] = "eth0";
+    EXPECT_EQ(module_.ProcessRequest(reset, answer), 0);
+    EXPECT_EQ(module_.GetContexts().count("eth0"), 0u);
+    module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", false, true);
+    EXPECT_THAT(TakeCalls(), ElementsAre(HasSubstr("route add"), HasSubstr("ipv6-restart eth0")));
+
+    // Both flags: managed.
+    module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", true, true);
+    EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_MANAGED);
+    EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
+                AllOf(HasSubstr("IPV6_AUTOCONF=no\n"), HasSubstr("DHCPV6C=yes\n"),
+                      Not(HasSubstr("DHCPV6C_OPTIONS"))));
+    ASSERT_EQ(VORNNetIPv6ConfGet("eth0", &config), 0);
+    EXPECT_EQ(config.type, VORN_NET_IPV6_TYPE_AUTO);
+    EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_MANAGED);
+
+    // Requests of other shapes change nothing and still answer 0.
+    for (const char* bad :
+         {"[]", "\"x\"", "{\"method\":1}", "{\"method\":\"RESET_IPV6_MODULE\"}"}) {
+        Json::Value request;
+        ASSERT_TRUE(vornwireless::utils::ParseJson(bad, request)) << bad;
+        EXPECT_EQ(module_.ProcessRequest(request, answer), 0) << bad;
+    }
+    EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_MANAGED);
+}
+
+TEST_F(IPv6ModuleTest, RoutersAndUnmanagedInterfacesAreNeverApplied) {
+    root_.WriteFile(kIfcfg + "lbr0", kAutoconf);
+    root_.WriteFile(kIfcfg + "eth1", std::string(kAutoconf) + "IPV6FORWARDING=yes\n");
+    root_.WriteFile(kIfcfg + "eth2", "IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\n");
+    root_.WriteFile(kIfcfg + "eth3", std::string(kAutoconf) + "IPV6ROUTER=yes\n");
+    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
+    root_.ClearCalls();
+    root_.WriteFile(kIfcfg + "eth0", std::string(kAutoconf) + "IPV6ROUTER=yes-please\n");
+    for (const char* ifname : {"lbr0", "eth0", "eth1", "eth2", "eth3"}) {
+        module_.ProcessRA("fe80::1", "2001:db8:1::", ifname, true, false);
+        EXPECT_EQ(Context(ifname).prefix, "") << ifname;
+        EXPECT_EQ(Context(ifname).state, InterfaceContext::STATE_NONE) << ifname;
+    }
+    EXPECT_THAT(TakeCalls(), IsEmpty());
+
+    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth9", false, false);
+    EXPECT_TRUE(log_.Contains("ipv6_module.cpp:"));
+    EXPECT_TRUE(log_.Contains("Fail to get ipv6 config(eth9)"));
+    EXPECT_EQ(module_.GetContexts().count("eth9"), 0u);
+    EXPECT_THAT(TakeCalls(), IsEmpty());
+}
+
+TEST_F(IPv6ModuleTest, FailedRegistrationStillSwitchesTheMode) {
+    manager_->RemoveModule(MODULE_ROUTE);
+    module_.ProcessRA("fe80::1", "", "eth0", true, false);
+    EXPECT_TRUE(log_.Contains("Failed to add gateway data ifname=eth0, gateway=fe80::1"));
+    EXPECT_THAT(TakeCalls(), ElementsAre("/etc/rc.network ipv6-restart eth0"));
+}
+
+TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixInterfaceAndFlags) {
+    root_.WriteFile(kIfcfg + "lo", kAutoconf);
+    Receive(
+        Advert(kManaged | kOther, {PrefixOption("2001:db8:7::"), PrefixOption("2001:db8:9::")}));
+    EXPECT_EQ(module_.AdvertisementsHandled(), 1u);
+    EXPECT_EQ(Context("lo").prefix, "2001:db8:9::");
+    EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_MANAGED);
+    EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::1 dev lo",
+                                         "/etc/rc.network ipv6-restart lo"));
+
+    Receive(Advert(kOther, {}));
+    EXPECT_EQ(Context("lo").prefix, "");
+    EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_OTHER);
+    // Solicitations are let through by the filter and left alone.
+    Receive({133, 0, 0, 0, 0, 0, 0, 0});
+    EXPECT_EQ(module_.AdvertisementsHandled(), 2u);
+}
+
+TEST_F(IPv6ModuleTest, MalformedPacketsAreDroppedWhole) {
+    root_.WriteFile(kIfcfg + "lo", kAutoconf);
+    const Bytes good = Advert(0, {PrefixOption("2001:db8:7::")});
+    // Every cut of a good advertisement: only those that end on an option boundary are read.
+    for (std::size_t len = 0; len <= good.size(); ++len) {
+        Receive(Bytes(good.begin(), good.begin() + static_cast<std::ptrdiff_t>(len)));
+    }
+    EXPECT_EQ(module_.AdvertisementsHandled(), 3u);  // 16, 24 and 56 bytes
+    EXPECT_TRUE(log_.Contains("received icmpv6 packet with invalid length: 7"));
+    EXPECT_TRUE(log_.Contains("received router advertisement with invalid length: 15"));
+    EXPECT_TRUE(log_.Contains("truncated option in RA (len 1)"));
+    EXPECT_TRUE(
+        log_.Contains("option length greater than total length in RA (type 3, optlen 32, len 31)"));
+    EXPECT_TRUE(
+        log_.Contains("option length greater than total length in RA (type 1, optlen 8, len 7)"));
+
+    log_.Clear();
+    root_.ClearCalls();
+    Receive(Advert(kManaged, {PrefixOption("2001:db8:8::"), {25, 0, 0, 0, 0, 0, 0, 0}}));
+    Receive(Advert(kManaged, {PrefixOption("", 1)}));
+    Receive(Advert(kManaged, {PrefixOption("", 3)}));
+    Receive(Advert(kManaged, {PrefixOption("2001:db8:8::")}), "2001:db8::1");
+    Receive(Advert(kManaged, {PrefixOption("2001:db8:8::")}), "fe80::1", 0x7fffffff);
+    Bytes coded = Advert(kManaged, {});
+    coded[1] = 1;
+    Receive(coded);
+    Receive({1, 0, 0, 0, 0, 0, 0, 0});
+    EXPECT_EQ(module_.AdvertisementsHandled(), 3u);
+    EXPECT_THAT(TakeCalls(), IsEmpty());
+    EXPECT_EQ(log_.Matching("zero length option in RA").size(), 1u);
+    EXPECT_TRUE(log_.Contains("prefix option too short in RA (optlen 8)"));
+    EXPECT_TRUE(log_.Contains("prefix option too short in RA (optlen 24)"));
+    EXPECT_TRUE(log_.Contains("Invalid router advertisement from 2001:db8::1 (code 0)"));
+    EXPECT_TRUE(log_.Contains("Failed to get interface name of index 2147483647"));
+    EXPECT_TRUE(log_.Contains("Invalid router advertisement from fe80::1 (code 1)"));
+    EXPECT_TRUE(log_.Contains("icmpv6 filter failed"));
+}
+
+TEST_F(IPv6ModuleTest, PacketInformationIsChecked) {
+    alignas(cmsghdr) unsigned char control[CMSG_SPACE(sizeof(in6_pktinfo))] = {};
+    msghdr message{};
+    message.msg_control = control;
+    message.msg_controllen = sizeof(control);
+    cmsghdr* header = CMSG_FIRSTHDR(&message);
+    header->cmsg_level = IPPROTO_IPV6;
+    header->cmsg_type = IPV6_PKTINFO;
+    header->cmsg_len = CMSG_LEN(sizeof(in6_pktinfo));
+    in6_pktinfo info{};
+    info.ipi6_ifindex = 11;
+    std::memcpy(CMSG_DATA(header), &info, sizeof(info));
+    const in6_pktinfo* found = IPv6Module::FindPacketInfo(message);
+    ASSERT_NE(found, nullptr);
+    EXPECT_EQ(found->ipi6_ifindex, 11u);
+
+    info.ipi6_ifindex = 0;
+    std::memcpy(CMSG_DATA(header), &info, sizeof(info));
+    EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
+    const std::string bogus = "received a bogus IPV6_PKTINFO from the kernel! len=" +
+                              std::to_string(CMSG_LEN(sizeof(in6_pktinfo)));
+    EXPECT_TRUE(log_.Contains(bogus + ", index=0\n"));
+
+    header->cmsg_len = CMSG_LEN(sizeof(int));
+    EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
+    EXPECT_TRUE(log_.Contains("received a bogus IPV6_PKTINFO from the kernel! len=" +
+                              std::to_string(CMSG_LEN(sizeof(int))) + ", index=0"));
+
+    message.msg_controllen = 0;
+    EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
+    EXPECT_TRUE(log_.Contains("received no IPV6_PKTINFO from the kernel"));
+}
+
+TEST_F(IPv6ModuleTest, ListeningThreadEndsWithTheModule) {
+    // Without a socket the thread waits on its wake-up pipe alone; the sanitizers catch a thread
+    // left running on freed memory.
+    auto* terminated = new IPv6Module();
+    EXPECT_EQ(terminated->StartModule(), 0);
+    EXPECT_EQ(terminated->TerminateModule(), 0);
+    EXPECT_EQ(terminated->TerminateModule(), 0);
+    delete terminated;
+    auto* deleted = new IPv6Module();
+    EXPECT_EQ(deleted->StartModule(), 0);
+    delete deleted;
+    EXPECT_THAT(log_.Lines(), IsEmpty());
+}
+
+TEST_F(IPv6ModuleTest, PlatformConfigurationOfAnInterface) {
+    VORN_NET_IPV6_CONFIG config;
+    const std::vector<std::pair<std::string, int>> files = {
+        {"", VORN_NET_IPV6_TYPE_OFF},
+        {"IPV6INIT=no\nIPV6_AUTOCONF=yes\n", VORN_NET_IPV6_TYPE_OFF},
+        {"IPV6INIT=YES\n", VORN_NET_IPV6_TYPE_AUTO},
+        {"IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\nIPV6_AUTOCONF=yes\n", VORN_NET_IPV6_TYPE_AUTO},
+        {"IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\n", VORN_NET_IPV6_TYPE_STATIC},
+        {"IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\nIPV6FORWARDING=yes\n", VORN_NET_IPV6_TYPE_ROUTER},
+    };
+    for (const auto& file : files) {
+        root_.WriteFile(kIfcfg + "eth1", file.first);
+        ASSERT_EQ(VORNNetIPv6ConfGet("eth1", &config), 0) << file.first;
+        EXPECT_EQ(config.type, file.second) << file.first;
+        EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_AUTOCONF) << file.first;
+    }
+    root_.WriteFile(kIfcfg + "eth1", "IPV6INIT=yes\nDHCPV6C=yes\nDHCPV6C_OPTIONS=\"-v -S\"\n");
+    ASSERT_EQ(VORNNetIPv6ConfGet("eth1", &config), 0);
+    EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_OTHER);
+    EXPECT_EQ(VORNNetIPv6ConfGet("eth9", &config), -1);
+    EXPECT_EQ(VORNNetIPv6ConfGet("../ifcfg-eth1", &config), -1);
+
+    EXPECT_EQ(VORNNetIPv6ConfSet(1, "eth1", 0, 0, 0), -1);
+    EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth9", 0, 0, 0), -1);
+    EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth1;reboot", 0, 0, 0), -1);
+    EXPECT_FALSE(root_.Exists(kIfcfg + "eth9"));
+    EXPECT_THAT(root_.Calls(), IsEmpty());
+    ASSERT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_AUTOCONF, "eth1", 0, 0, 0), 0);
+    EXPECT_EQ(root_.ReadFile(kIfcfg + "eth1"), "IPV6INIT=yes\nDHCPV6C=no\nIPV6_AUTOCONF=yes\n");
+    root_.Scenario("rc.network", "when ipv6-restart eth1\nexit 1\n");
+    EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth1", 0, 0, 0), -1);
+}
+
+}  // namespace
+}  // namespace module
+}  // namespace network
+}  // namespace vornnetwork
