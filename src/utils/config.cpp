@@ -13,6 +13,7 @@
 #include "platform/root_path.h"
 #include "utils/file.h"
 #include "utils/log.h"
+#include "utils/temp_file.h"
 
 namespace vornwireless {
 namespace utils {
@@ -20,7 +21,6 @@ namespace {
 
 constexpr int kHashCapacity = 1024;
 constexpr size_t kPathBuffer = 1024;
-constexpr const char* kTempSuffix = ".tmp.XXXXXX";
 
 std::string ToText(bool value) {
     return value ? "yes" : "no";
@@ -57,52 +57,6 @@ struct HashHolder {
 struct ListHolder {
     QLIBSZLIST* list = QLIBCSzListAlloc(kHashCapacity);
     ~ListHolder() { QLIBCSzListFree(list); }
-};
-
-// The temporary file of a sectioned write: made under the root, named by its logical path.
-class TempFile {
-  public:
-    explicit TempFile(const std::string& logicalName) {
-        char logical[kPathBuffer] = {};
-        std::snprintf(logical, sizeof(logical), "%s%s", logicalName.c_str(), kTempSuffix);
-        logical_ = logical;
-        std::string real = vorn::platform::RootPath(logical_);
-        fd_ = mkstemp(&real[0]);
-        if (fd_ >= 0) {
-            // mkstemp filled in the last six characters of the real name; the logical name has the
-            // same ending.
-            logical_.replace(logical_.size() - 6, 6, real.substr(real.size() - 6));
-        }
-    }
-    ~TempFile() { Close(); }
-    TempFile(const TempFile&) = delete;
-    TempFile& operator=(const TempFile&) = delete;
-
-    bool Created() const { return fd_ >= 0; }
-    const std::string& Logical() const { return logical_; }
-    FILE* Open() {
-        stream_ = fdopen(fd_, "w");
-        return stream_;
-    }
-    // Flushes to disk and closes; false when the content may not have reached the file.
-    bool Close() {
-        bool ok = true;
-        if (stream_ != nullptr) {
-            ok = std::fflush(stream_) == 0 && fsync(fileno(stream_)) == 0;
-            ok = std::fclose(stream_) == 0 && ok;
-            stream_ = nullptr;
-            fd_ = -1;
-        } else if (fd_ >= 0) {
-            close(fd_);
-            fd_ = -1;
-        }
-        return ok;
-    }
-
-  private:
-    std::string logical_;
-    int fd_ = -1;
-    FILE* stream_ = nullptr;
 };
 
 }  // namespace

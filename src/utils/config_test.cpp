@@ -51,6 +51,13 @@ TEST_F(ConfigTest, SectionsWriteInOrderAndReadBack) {
     struct stat info;
     ASSERT_EQ(stat(root_.Path("/usr/vorn/etc/wifi/new").c_str(), &info), 0);
     EXPECT_EQ(info.st_mode & 0777, 0755u);
+    // A new file is readable by all; a replaced one keeps its mode.
+    ASSERT_EQ(stat(root_.Path(config.GetNameString()).c_str(), &info), 0);
+    EXPECT_EQ(info.st_mode & 0777, 0644u);
+    chmod(root_.Path(config.GetNameString()).c_str(), 0640);
+    ASSERT_EQ(config.Write(), 0);
+    ASSERT_EQ(stat(root_.Path(config.GetNameString()).c_str(), &info), 0);
+    EXPECT_EQ(info.st_mode & 0777, 0640u);
     EXPECT_TRUE(Leftovers("/usr/vorn/etc/wifi/new", "wifi_ap_001122334455.tmp.").empty());
 
     ConfigSection reread(config.GetNameString());

@@ -1,0 +1,276 @@
+#include "network/dhcp/dhcpd_config.h"
+
+#include <dirent.h>
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "platform/qlibc_error.h"
+#include "support/sim_root.h"
+
+namespace vornnetwork {
+namespace network {
+namespace dhcp {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using HashPtr = std::unique_ptr<QLIBSZHASH, decltype(&QLIBCSzHashFree)>;
+
+template <size_t N>
+void Set(char (&field)[N], const char* value) {
+    std::snprintf(field, N, "%s", value);
+}
+
+DHCPD_CONF Service(SERVICE_TYPE type, const char* ifname) {
+    DHCPD_CONF conf{};
+    conf.type = type;
+    conf.lease = 86400;
+    Set(conf.ifname, ifname);
+    return conf;
+}
+
+DHCPD_CONF Subnet4(const char* ifname, const char* start) {
+    DHCPD_CONF conf = Service(SERVICE_TYPE_IPV4, ifname);
+    Set(conf.start, start);
+    Set(conf.end, "192.168.1.200");
+    Set(conf.netmask, "255.255.255.0");
+    return conf;
+}
+
+HashPtr Info(const char* enable) {
+    HashPtr hash(QLIBCSzHashAlloc(4), QLIBCSzHashFree);
+    if (enable != nullptr) {
+        QLIBCSzHashSetValue(hash.get(), "enable", enable);
+    }
+    return hash;
+}
+
+class DhcpdConfigTest : public vorn::test::RootTest {
+  protected:
+    std::string Read(const std::string& name) const { return root_.ReadFile("/etc/dhcpd/" + name); }
+    std::vector<std::string> Files() const {
+        std::vector<std::string> names;
+        if (DIR* dir = opendir(root_.Path("/etc/dhcpd").c_str())) {
+            while (const dirent* entry = readdir(dir)) {
+                if (entry->d_name[0] != '.') {
+                    names.push_back(entry->d_name);
+                }
+            }
+            closedir(dir);
+        }
+        std::sort(names.begin(), names.end());
+        return names;
+    }
+};
+
+TEST_F(DhcpdConfigTest, FileNamesCutTheInterfaceAndRefuseBadTypesAndIndices) {
+    std::string name;
+    ASSERT_EQ(DhcpdConfig::getFileName(name, "eth0", SERVICE_TYPE_IPV4, true, 0), 0);
+    EXPECT_EQ(name, "/etc/dhcpd/dhcpd-eth0-eth00.conf");
+    ASSERT_EQ(DhcpdConfig::getFileName(name, "eth0.5", SERVICE_TYPE_IPV6, false, 0), 0);
+    EXPECT_EQ(name, "/etc/dhcpd/dhcpd-eth0-eth0v60.info");
+    ASSERT_EQ(DhcpdConfig::getFileName(name, "br0;rm", SERVICE_TYPE_PXE, true, 7), 0);
+    EXPECT_EQ(name, "/etc/dhcpd/dhcpd-br0-pxe.conf");
+    ASSERT_EQ(DhcpdConfig::getFileName(name, "eth1/../x", SERVICE_TYPE_WPAD, false), 0);
+    EXPECT_EQ(name, "/etc/dhcpd/wpad-eth1.info");
+
+    for (int type : {0, 3, 16}) {
+        QLIBCErrSet(QLIBC_ERR_NONE);
+        EXPECT_EQ(DhcpdConfig::getFileName(name, "eth0", static_cast<SERVICE_TYPE>(type), true),
+                  -1);
+        EXPECT_EQ(QLIBCErrGet(), 3328);
+    }
+    QLIBCErrSet(QLIBC_ERR_NONE);
+    EXPECT_EQ(DhcpdConfig::getFileName(name, "eth0", SERVICE_TYPE_IPV4, true, -1), -1);
+    EXPECT_EQ(QLIBCErrGet(), 3328);
+    EXPECT_EQ(DhcpdConfig::getFileName(name, "../etc", SERVICE_TYPE_IPV4, true), -1);
+    EXPECT_EQ(DhcpdConfig::getSubnetCnt("eth0", 32), -1);
+    EXPECT_TRUE(log_.Contains("dhcpd_config.cpp:"));
+}
+
+TEST_F(DhcpdConfigTest, FilesHoldDnsmasqLinesByteForByte) {
+    DHCPD_CONF v4 = Subnet4("eth0.5", "192.168.1.100");
+    Set(v4.router, "192.168.1.1");
+    Set(v4.domain, "lan.example");
+    Set(v4.dns1, "192.168.1.1");
+    DHCPD_CONF v6 = Service(SERVICE_TYPE_IPV6, "eth0");
+    Set(v6.start, "2001:db8::100");
+    Set(v6.end, "2001:db8::1ff");
+    Set(v6.netmask, "64");
+    Set(v6.dns1, "2001:db8::1");
+    Set(v6.dns2, "2001:db8::2");
+    DHCPD_CONF pxe = Subnet4("eth0", "192.168.1.210");
+    pxe.type = SERVICE_TYPE_PXE;
+    Set(pxe.boot, "pxelinux.0");
+    const DHCPD_CONF wpad = Service(SERVICE_TYPE_WPAD, "eth0");
+    ASSERT_EQ(DhcpdConfig::saveConf({v4, Subnet4("eth0", "192.168.1.150"), v6, pxe, wpad}, "eth0",
+                                    SERVICE_TYPE_ALL),
+              5);
+
+    EXPECT_EQ(Read("dhcpd-eth0-eth00.conf"),
+              "interface=eth0.5\n"
+              "dhcp-range=set:eth00,192.168.1.100,192.168.1.200,255.255.255.0,86400\n"
+              "dhcp-option=tag:eth00,option:router,192.168.1.1\n"
+              "dhcp-option=tag:eth00,option:domain-search,lan.example\n"
+              "dhcp-option=tag:eth00,option:domain-name,lan.example\n"
+              "dhcp-option=tag:eth00,option:dns-server,192.168.1.1\n");
+    EXPECT_EQ(Read("dhcpd-eth0-eth01.conf"),
+              "interface=eth0\n"
+              "dhcp-range=set:eth01,192.168.1.150,192.168.1.200,255.255.255.0,86400\n");
+    EXPECT_EQ(Read("dhcpd-eth0-eth0v60.conf"),
+              "interface=eth0\n"
+              "dhcp-range=set:eth0v60,2001:db8::100,2001:db8::1ff,64,86400\n"
+              "dhcp-option=tag:eth0v60,option6:dns-server,2001:db8::1,2001:db8::2\n");
+    EXPECT_EQ(Read("dhcpd-eth0-pxe.conf"),
+              "interface=eth0\n"
+              "dhcp-range=set:eth0pxe,192.168.1.210,192.168.1.200,255.255.255.0,86400\n"
+              "dhcp-boot=tag:eth0pxe,pxelinux.0\n"
+              "dhcp-vendorclass=set:pxe,PXEClient\n");
+    EXPECT_EQ(Read("wpad-eth0.conf"), "dhcp-option=tag:eth0,252\n");
+
+    std::string tmpPath;
+    DHCPD_CONF withUrl = wpad;
+    Set(withUrl.router, "http://wpad/p.dat");
+    ASSERT_EQ(DhcpdConfig::saveConfFile(tmpPath, withUrl, "lan"), 0);
+    EXPECT_THAT(tmpPath, ::testing::MatchesRegex("/etc/dhcpd/wpad-eth0\\.conf\\.tmp\\.......$"));
+    EXPECT_EQ(root_.ReadFile(tmpPath), "dhcp-option=tag:lan,252,http://wpad/p.dat\n");
+    EXPECT_EQ(Read("wpad-eth0.conf"), "dhcp-option=tag:eth0,252\n");
+}
+
+TEST_F(DhcpdConfigTest, CountsStopAtTheFirstIncompleteServiceAndFlagsComeFromInfoFiles) {
+    for (const char* name :
+         {"dhcpd-eth0-eth00.conf", "dhcpd-eth0-eth00.info", "dhcpd-eth0-eth01.conf",
+          "dhcpd-eth0-eth01.info", "dhcpd-eth0-eth02.conf", "dhcpd-eth0-eth03.conf",
+          "dhcpd-eth0-eth03.info", "dhcpd-eth0-pxe.info", "wpad-eth0.conf", "wpad-eth0.info"}) {
+        root_.WriteFile(std::string("/etc/dhcpd/") + name, "enable=\"no\"\n");
+    }
+    root_.WriteFile("/etc/dhcpd/dhcpd-eth0-eth01.info", "pxe=\"x\"\nenable=\"yes\"\n");
+    root_.WriteFile("/etc/dhcpd/dhcpd-eth0-eth03.info", "enable=\"yes\"\n");
+
+    EXPECT_EQ(DhcpdConfig::getSubnetCntType("eth0", SERVICE_TYPE_IPV4), 2);
+    EXPECT_EQ(DhcpdConfig::getSubnetCntType("eth0.5", SERVICE_TYPE_IPV6), 0);
+    EXPECT_EQ(DhcpdConfig::getSubnetCntType("eth0", SERVICE_TYPE_PXE), 0);
+    EXPECT_EQ(DhcpdConfig::getSubnetCntType("eth0", SERVICE_TYPE_WPAD), 1);
+    EXPECT_EQ(DhcpdConfig::getSubnetCnt("eth0", SERVICE_TYPE_ALL), 3);
+    EXPECT_EQ(DhcpdConfig::getSubnetCnt("eth0", SERVICE_TYPE_PXE | SERVICE_TYPE_WPAD), 1);
+
+    EXPECT_TRUE(DhcpdConfig::isEnabledFile("/etc/dhcpd/dhcpd-eth0-eth01.info"));
+    EXPECT_FALSE(DhcpdConfig::isEnabledFile("/etc/dhcpd/dhcpd-eth0-eth00.info"));
+    EXPECT_FALSE(DhcpdConfig::isEnabledFile("/etc/dhcpd/missing.info"));
+    EXPECT_TRUE(DhcpdConfig::isEnabledType("eth0", SERVICE_TYPE_IPV4));
+    EXPECT_FALSE(DhcpdConfig::isEnabledType("eth0", SERVICE_TYPE_WPAD));
+    EXPECT_TRUE(DhcpdConfig::isEnabled("eth0", SERVICE_TYPE_ALL));
+    EXPECT_FALSE(DhcpdConfig::isEnabled("eth0", SERVICE_TYPE_WPAD | SERVICE_TYPE_PXE));
+    // Index 3 is enabled but lies beyond the count.
+    root_.WriteFile("/etc/dhcpd/dhcpd-eth0-eth01.info", "enable=\"no\"\n");
+    EXPECT_FALSE(DhcpdConfig::isEnabledType("eth0", SERVICE_TYPE_IPV4));
+}
+
+TEST_F(DhcpdConfigTest, SavedServicesLoadBackAndFewerServicesDropTheRest) {
+    DHCPD_CONF v4 = Subnet4("eth0.5", "192.168.1.100");
+    Set(v4.domain, "lan.example");
+    Set(v4.dns1, "192.168.1.1");
+    Set(v4.dns2, "192.168.1.2");
+    DHCPD_CONF wpad = Service(SERVICE_TYPE_WPAD, "eth0");
+    Set(wpad.router, "http://wpad/p.dat");
+    wpad.lease = 0;
+    const std::vector<DHCPD_CONF> saved = {wpad, v4, Subnet4("eth0", "192.168.1.101"),
+                                           Subnet4("eth0", "192.168.1.102"),
+                                           Subnet4("eth1", "192.168.2.100")};
+    ASSERT_EQ(DhcpdConfig::saveConf(saved, "eth0", SERVICE_TYPE_IPV4 | SERVICE_TYPE_WPAD), 4);
+    HashPtr info = Info("yes");
+    QLIBCSzHashSetValue(info.get(), "url", "http://wpad/p.dat");
+    QLIBCSzHashSetValue(info.get(), "other", "dropped");
+    for (int index = 0; index < 3; ++index) {
+        ASSERT_EQ(DhcpdConfig::saveInfo(info.get(), "eth0", SERVICE_TYPE_IPV4, index), 0);
+    }
+    ASSERT_EQ(DhcpdConfig::saveInfo(info.get(), "eth0", SERVICE_TYPE_WPAD), 0);
+    EXPECT_EQ(Read("wpad-eth0.info"), "enable=\"yes\"\nurl=\"http://wpad/p.dat\"\n");
+
+    std::vector<DHCPD_CONF> loaded;
+    ASSERT_EQ(DhcpdConfig::loadConf(loaded, "eth0", SERVICE_TYPE_ALL), 4);
+    ASSERT_EQ(loaded.size(), 4u);
+    for (size_t i = 0; i < 3; ++i) {
+        DHCPD_CONF expected = saved[i + 1];
+        expected.index = static_cast<uint32_t>(i);
+        EXPECT_EQ(std::memcmp(&loaded[i], &expected, sizeof(expected)), 0) << i;
+    }
+    EXPECT_EQ(std::memcmp(&loaded[3], &wpad, sizeof(wpad)), 0);
+
+    HashPtr read = Info(nullptr);
+    ASSERT_EQ(DhcpdConfig::loadInfo(read.get(), "eth0", SERVICE_TYPE_WPAD), 2);
+    EXPECT_STREQ(QLIBCSzHashGetValue(read.get(), "url"), "http://wpad/p.dat");
+
+    ASSERT_EQ(DhcpdConfig::saveConf({v4}, "eth0", SERVICE_TYPE_ALL), 1);
+    EXPECT_EQ(DhcpdConfig::getSubnetCnt("eth0", SERVICE_TYPE_ALL), 1);
+    EXPECT_THAT(Files(),
+                ElementsAre("dhcpd-eth0-eth00.conf", "dhcpd-eth0-eth00.info",
+                            "dhcpd-eth0-eth01.info", "dhcpd-eth0-eth02.info", "wpad-eth0.info"));
+}
+
+TEST_F(DhcpdConfigTest, FailedSavesLeaveThePreviousFiles) {
+    ASSERT_EQ(DhcpdConfig::saveConf({Subnet4("eth0", "192.168.1.100")}, "eth0", SERVICE_TYPE_IPV4),
+              1);
+    HashPtr info = Info("yes");
+    ASSERT_EQ(DhcpdConfig::saveInfo(info.get(), "eth0", SERVICE_TYPE_IPV4), 0);
+    const std::string conf = Read("dhcpd-eth0-eth00.conf");
+
+    DHCPD_CONF injected = Subnet4("eth0", "192.168.1.100");
+    Set(injected.domain, "lan\ndhcp-script=/tmp/x");
+    QLIBCErrSet(QLIBC_ERR_NONE);
+    EXPECT_EQ(DhcpdConfig::saveConf({Subnet4("eth0", "192.168.1.9"), injected}, "eth0",
+                                    SERVICE_TYPE_IPV4),
+              -1);
+    EXPECT_EQ(QLIBCErrGet(), 3328);
+    const DHCPD_CONF pxe = Service(SERVICE_TYPE_PXE, "eth0");
+    EXPECT_EQ(DhcpdConfig::saveConfType({pxe, pxe}, "eth0", SERVICE_TYPE_PXE), -1);
+
+    HashPtr noEnable = Info(nullptr);
+    EXPECT_EQ(DhcpdConfig::saveInfo(noEnable.get(), "eth0", SERVICE_TYPE_IPV4), -1);
+    EXPECT_TRUE(log_.Contains(
+        "Failed to write /etc/dhcpd/dhcpd-eth0-eth00.info: \"enable\" key is not found"));
+
+    // A directory in the way of the final name: the rename fails and its temporary file goes.
+    root_.WriteFile("/etc/dhcpd/dhcpd-eth0-eth0v60.conf/keep", "");
+    QLIBCErrSet(QLIBC_ERR_NONE);
+    EXPECT_EQ(
+        DhcpdConfig::saveConf({Service(SERVICE_TYPE_IPV6, "eth0")}, "eth0", SERVICE_TYPE_IPV6), -1);
+    EXPECT_EQ(QLIBCErrGet(), 2304);
+    EXPECT_TRUE(
+        log_.Contains("Failed to rename file from \"/etc/dhcpd/dhcpd-eth0-eth0v60.conf.tmp."));
+
+    EXPECT_EQ(Read("dhcpd-eth0-eth00.conf"), conf);
+    EXPECT_EQ(Read("dhcpd-eth0-eth00.info"), "enable=\"yes\"\n");
+    EXPECT_THAT(Files(), ElementsAre("dhcpd-eth0-eth00.conf", "dhcpd-eth0-eth00.info",
+                                     "dhcpd-eth0-eth0v60.conf"));
+}
+
+TEST_F(DhcpdConfigTest, MalformedConfFilesAreRefused) {
+    DHCPD_CONF conf{};
+    const std::string path = "/etc/dhcpd/dhcpd-eth0-eth00.conf";
+    root_.WriteFile(path, "# kept\nlog-dhcp\ndhcp-option=tag:a,option:ntp-server,1.2.3.4\n");
+    EXPECT_EQ(DhcpdConfig::loadConfFile(conf, path), 0);
+    for (const std::string& text : std::vector<std::string>{
+             "dhcp-range=set:a,1.1.1.1,1.1.1.2,255.0.0.0\n", "dhcp-range=set:a,1,2,3,-5\n",
+             "dhcp-range=set:a,1,2,3,99999999999\n", "interface=averyveryverylongname\n",
+             "dhcp-option=tag:a,option:router,1.1.1.1,2.2.2.2\n", "dhcp-boot=tag:a\n",
+             "dhcp-option=tag:a,252,http://x,y\n", std::string("interface=eth0\0x\n", 17)}) {
+        root_.WriteFile(path, text);
+        QLIBCErrSet(QLIBC_ERR_NONE);
+        EXPECT_EQ(DhcpdConfig::loadConfFile(conf, path), -1) << text;
+        EXPECT_NE(QLIBCErrGet(), QLIBC_ERR_NONE) << text;
+    }
+    EXPECT_THAT(log_.Matching("Malformed line in " + path), ::testing::SizeIs(7));
+}
+
+}  // namespace
+}  // namespace dhcp
+}  // namespace network
+}  // namespace vornnetwork
