@@ -22,6 +22,7 @@
 #include "platform/qlibc_file.h"
 #include "support/net_namespace.h"
 #include "support/sim_root.h"
+#include "support/waiting.h"
 
 extern char** environ;
 
@@ -30,22 +31,13 @@ namespace network {
 namespace dhcp {
 namespace {
 
+using vorn::test::WaitFor;
+
 using ::testing::HasSubstr;
 using vorn::test::SimRoot;
 
 constexpr const char* kClientMac = "02:00:00:00:77:02";
 constexpr const char* kLeaseFile = "/etc/dhcpd/dhcpd.conf.leases";
-
-bool WaitFor(const std::function<bool()>& done) {
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(20);
-    while (!done()) {
-        if (std::chrono::steady_clock::now() > deadline) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(50));
-    }
-    return true;
-}
 
 // Output and exit status of a host command line (never moved under the root).
 std::string Shell(const std::string& command, int* status = nullptr) {

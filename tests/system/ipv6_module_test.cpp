@@ -22,11 +22,15 @@
 #include "support/net_namespace.h"
 #include "support/private_bus.h"
 #include "support/sim_root.h"
+#include "support/waiting.h"
 
 namespace vornnetwork {
 namespace network {
 namespace module {
 namespace {
+
+using vorn::test::Shell;
+using vorn::test::WaitFor;
 
 using ::testing::AllOf;
 using ::testing::HasSubstr;
@@ -37,28 +41,6 @@ using vorn::test::SimRoot;
 constexpr char kHostIp[] = "/usr/sbin/ip";
 constexpr char kHostRadvd[] = "/usr/sbin/radvd";
 constexpr char kRestart[] = "/etc/rc.network ipv6-restart h0";
-
-bool WaitFor(const std::function<bool()>& done) {
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(15);
-    while (!done()) {
-        if (std::chrono::steady_clock::now() > deadline) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(20));
-    }
-    return true;
-}
-
-// Every output line of a shell command line, its standard error included.
-std::string Shell(const std::string& command) {
-    std::vector<std::string> lines;
-    EXPECT_EQ(vorn::platform::ReadShellCommandLines(command + " 2>&1", lines), 0) << command;
-    std::string text;
-    for (const std::string& line : lines) {
-        text += line + "\n";
-    }
-    return text;
-}
 
 class IPv6ModuleSystemTest : public ::testing::Test {
   protected:

@@ -14,28 +14,20 @@
 #include "platform/shell_command.h"
 #include "support/net_namespace.h"
 #include "support/sim_root.h"
+#include "support/waiting.h"
 
 namespace vornnetwork {
 namespace network {
 namespace module {
 namespace {
 
+using vorn::test::WaitFor;
+
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using vorn::test::SimRoot;
 
 constexpr auto kDeadline = std::chrono::seconds(10);
-
-bool WaitFor(const std::function<bool()>& done) {
-    const auto deadline = std::chrono::steady_clock::now() + kDeadline;
-    while (!done()) {
-        if (std::chrono::steady_clock::now() > deadline) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(20));
-    }
-    return true;
-}
 
 // The real kernel in a private namespace, the live root's simulated /etc/rc.network recording
 // the platform's link handlers, and hook scripts recording their variables.

@@ -16,6 +16,7 @@
 #include "platform/shell_command.h"
 #include "support/net_namespace.h"
 #include "support/sim_root.h"
+#include "support/waiting.h"
 #include "utils/json_text.h"
 
 namespace vornnetwork {
@@ -23,31 +24,12 @@ namespace network {
 namespace module {
 namespace {
 
+using vorn::test::Shell;
+using vorn::test::WaitFor;
+
 using ::testing::HasSubstr;
 using ::testing::Not;
 using vorn::test::SimRoot;
-
-bool WaitFor(const std::function<bool()>& done) {
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(10);
-    while (!done()) {
-        if (std::chrono::steady_clock::now() > deadline) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(20));
-    }
-    return true;
-}
-
-// Every output line of a shell command line, its standard error included.
-std::string Shell(const std::string& command) {
-    std::vector<std::string> lines;
-    EXPECT_EQ(vorn::platform::ReadShellCommandLines(command + " 2>&1", lines), 0) << command;
-    std::string text;
-    for (const std::string& line : lines) {
-        text += line + "\n";
-    }
-    return text;
-}
 
 std::string Carrier(const std::string& ifname) {
     std::string value;

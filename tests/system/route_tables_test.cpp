@@ -12,11 +12,14 @@
 #include "platform/shell_command.h"
 #include "support/net_namespace.h"
 #include "support/sim_root.h"
+#include "support/waiting.h"
 #include "utils/json_text.h"
 
 namespace vornnetwork {
 namespace network {
 namespace {
+
+using vorn::test::Shell;
 
 using ::testing::HasSubstr;
 using ::testing::Not;
@@ -40,16 +43,6 @@ class BindMount {
     std::string to_;
     bool mounted_ = false;
 };
-
-std::string Shell(const std::string& command) {
-    std::vector<std::string> lines;
-    EXPECT_EQ(vorn::platform::ReadShellCommandLines(command + " 2>&1", lines), 0);
-    std::string text;
-    for (const std::string& line : lines) {
-        text += line + "\n";
-    }
-    return text;
-}
 
 size_t Count(const std::string& text, const std::string& part) {
     size_t count = 0;

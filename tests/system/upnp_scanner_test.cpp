@@ -23,11 +23,14 @@
 #include "support/log_capture.h"
 #include "support/net_namespace.h"
 #include "support/private_bus.h"
+#include "support/waiting.h"
 
 namespace vornnetwork {
 namespace network {
 namespace module {
 namespace {
+
+using vorn::test::WaitFor;
 
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
@@ -39,16 +42,6 @@ constexpr char kFriendlyName[] = "Vorn Test Media";
 constexpr char kModelName[] = "Vorn DLNA 7";
 
 // A search collects answers for 13 seconds; a little more covers start-up and teardown.
-bool WaitFor(const std::function<bool()>& done, std::chrono::seconds limit) {
-    const auto deadline = std::chrono::steady_clock::now() + limit;
-    while (!done()) {
-        if (std::chrono::steady_clock::now() > deadline) {
-            return false;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(50));
-    }
-    return true;
-}
 
 bool AcceptsConnections(const char* address, std::uint16_t port) {
     const int fd = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);

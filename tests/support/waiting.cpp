@@ -1,0 +1,35 @@
+#include "support/waiting.h"
+
+#include <gtest/gtest.h>
+
+#include <thread>
+#include <vector>
+
+#include "platform/shell_command.h"
+
+namespace vorn {
+namespace test {
+
+bool WaitFor(const std::function<bool()>& done, std::chrono::milliseconds limit) {
+    const auto deadline = std::chrono::steady_clock::now() + limit;
+    while (!done()) {
+        if (std::chrono::steady_clock::now() > deadline) {
+            return false;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    }
+    return true;
+}
+
+std::string Shell(const std::string& command) {
+    std::vector<std::string> lines;
+    EXPECT_EQ(platform::ReadShellCommandLines(command + " 2>&1", lines), 0) << command;
+    std::string text;
+    for (const std::string& line : lines) {
+        text += line + "\n";
+    }
+    return text;
+}
+
+}  // namespace test
+}  // namespace vorn

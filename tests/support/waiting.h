@@ -1,0 +1,22 @@
+#ifndef VORN_TEST_WAITING_H
+#define VORN_TEST_WAITING_H
+
+#include <chrono>
+#include <functional>
+#include <string>
+
+namespace vorn {
+namespace test {
+
+// Polls done every 20 ms until it holds (true) or limit passes (false).
+bool WaitFor(const std::function<bool()>& done,
+             std::chrono::milliseconds limit = std::chrono::seconds(20));
+
+// Every output line of a shell command line, standard error included, its absolute programs run
+// under the root as the library's own command lines are.
+std::string Shell(const std::string& command);
+
+}  // namespace test
+}  // namespace vorn
+
+#endif
