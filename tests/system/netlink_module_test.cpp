@@ -27,7 +27,6 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using vorn::test::SimRoot;
 
-constexpr auto kDeadline = std::chrono::seconds(10);
 
 // The real kernel in a private namespace, the live root's simulated /etc/rc.network recording
 // the platform's link handlers, and hook scripts recording their variables.
