@@ -289,6 +289,23 @@ int SelectServices(const std::vector<DHCPD_CONF>& confs, const std::string& ifna
     return 0;
 }
 
+// The write stream of a new temporary file; null (logged, platform error set, the file removed)
+// when it cannot be made or opened.
+FILE* OpenTemporary(TempFile& temp) {
+    if (!temp.Created()) {
+        VORN_LOG(LOG_ERR, "Failed to create a temporary file: %s", temp.Logical().c_str());
+        Fail(QLIBC_ERR_FILE_IO);
+        return nullptr;
+    }
+    FILE* stream = temp.Open();
+    if (stream == nullptr) {
+        VORN_LOG(LOG_ERR, "Failed to open a temporary file: %s", temp.Logical().c_str());
+        RemoveTemporary(temp.Logical());
+        Fail(QLIBC_ERR_FILE_IO);
+    }
+    return stream;
+}
+
 }  // namespace
 
 const SERVICE_TYPE DhcpdConfig::kServiceTypes[4] = {SERVICE_TYPE_IPV4, SERVICE_TYPE_IPV6,
@@ -463,15 +480,9 @@ int DhcpdConfig::saveConfFile(std::string& tmpPath, const DHCPD_CONF& conf,
         return -1;
     }
     TempFile temp(path);
-    if (!temp.Created()) {
-        VORN_LOG(LOG_ERR, "Failed to create a temporary file: %s", temp.Logical().c_str());
-        return Fail(QLIBC_ERR_FILE_IO);
-    }
-    FILE* stream = temp.Open();
+    FILE* stream = OpenTemporary(temp);
     if (stream == nullptr) {
-        VORN_LOG(LOG_ERR, "Failed to open a temporary file: %s", temp.Logical().c_str());
-        RemoveTemporary(temp.Logical());
-        return Fail(QLIBC_ERR_FILE_IO);
+        return -1;
     }
     // A write error (a full disk) may show only when the buffered data is flushed.
     const bool written = WriteService(stream, conf, tag);
@@ -593,15 +604,9 @@ int DhcpdConfig::saveInfoFile(std::string& tmpPath, QLIBSZHASH* hash, const std:
         return -1;
     }
     TempFile temp(path);
-    if (!temp.Created()) {
-        VORN_LOG(LOG_ERR, "Failed to create a temporary file: %s", temp.Logical().c_str());
-        return Fail(QLIBC_ERR_FILE_IO);
-    }
-    FILE* stream = temp.Open();
+    FILE* stream = OpenTemporary(temp);
     if (stream == nullptr) {
-        VORN_LOG(LOG_ERR, "Failed to open a temporary file: %s", temp.Logical().c_str());
-        RemoveTemporary(temp.Logical());
-        return Fail(QLIBC_ERR_FILE_IO);
+        return -1;
     }
     const bool written = QLIBCFileHash2File(stream, nullptr, info.get(), "%s=\"%s\"\n") == 0;
     if (!temp.Close() || !written) {

@@ -26,17 +26,6 @@ constexpr const char* kDefaultDisplayName = "General DMA";
 constexpr std::streamoff kMaxListFileSize = 4 * 1024 * 1024;
 constexpr int kMaxListDepth = 16;
 
-class ListLock {
-  public:
-    explicit ListLock(pthread_mutex_t& mutex) : mutex_(mutex) { pthread_mutex_lock(&mutex_); }
-    ~ListLock() { pthread_mutex_unlock(&mutex_); }
-    ListLock(const ListLock&) = delete;
-    ListLock& operator=(const ListLock&) = delete;
-
-  private:
-    pthread_mutex_t& mutex_;
-};
-
 // A member's value as text; empty for a missing member, an array or an object.
 std::string TextOf(const Json::Value& object, const char* key) {
     if (!object.isObject() || !object.isMember(key)) {

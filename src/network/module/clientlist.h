@@ -41,6 +41,18 @@ class ClientList {
     std::string GetLocalTime();
 
   protected:
+    // Holds the list's mutex for one scope.
+    class ListLock {
+      public:
+        explicit ListLock(pthread_mutex_t& mutex) : mutex_(mutex) { pthread_mutex_lock(&mutex_); }
+        ~ListLock() { pthread_mutex_unlock(&mutex_); }
+        ListLock(const ListLock&) = delete;
+        ListLock& operator=(const ListLock&) = delete;
+
+      private:
+        pthread_mutex_t& mutex_;
+    };
+
     pthread_mutex_t mutex;
     Json::Value root;
 };

@@ -27,17 +27,6 @@ constexpr std::size_t kMaxDescriptionLength = 64 * 1024;
 constexpr const char* kNameTags[] = {"deviceType", "modelName", "modelDescription", "friendlyName",
                                      "manufacturer"};
 
-class ListLock {
-  public:
-    explicit ListLock(pthread_mutex_t& mutex) : mutex_(mutex) { pthread_mutex_lock(&mutex_); }
-    ~ListLock() { pthread_mutex_unlock(&mutex_); }
-    ListLock(const ListLock&) = delete;
-    ListLock& operator=(const ListLock&) = delete;
-
-  private:
-    pthread_mutex_t& mutex_;
-};
-
 // A device's own text made fit for the list: control characters as blanks, trimmed, at most
 // kMaxTextLength bytes. ixml hands out valid UTF-8 only; a cut never splits a character.
 std::string CleanText(const char* raw) {
