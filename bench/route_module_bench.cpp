@@ -10,40 +10,18 @@
 #include <memory>
 #include <string>
 
-#include "support/private_bus.h"
-#include "support/sim_root.h"
+#include "echo_rig.h"
 
 namespace {
 
-using vorn::test::DaemonProcess;
 
-constexpr char kNetService[] = "com.tessarin.net";
-constexpr char kEchoService[] = "com.tessarin.bench.echo";
-constexpr DaemonProcess::Timeout kStartTimeout{30000};
 constexpr int kCallTimeoutMs = 10000;
 
-using Connection = std::unique_ptr<GDBusConnection, decltype(&g_object_unref)>;
+using vorn::bench::EchoRig;
+using vorn::bench::kEchoService;
+using vorn::bench::kNetService;
 
-struct Rig {
-    vorn::test::PrivateBus bus;
-    vorn::test::SimRoot root;
-    DaemonProcess vornnetd{{VORN_BINARY_DIR "/daemons/vornnetd", "--foreground"}};
-    DaemonProcess echo{{VORN_ECHO_SERVICE}};
-    Connection connection{nullptr, &g_object_unref};
-
-    bool Start() {
-        if (!bus.Started() || !vornnetd.WaitForBusName(kNetService, kStartTimeout) ||
-            !echo.WaitForBusName(kEchoService, kStartTimeout)) {
-            std::fprintf(stderr, "cannot start the rig:\n%s%s", vornnetd.Stderr().c_str(),
-                         echo.Stderr().c_str());
-            return false;
-        }
-        connection.reset(g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr));
-        return connection != nullptr;
-    }
-};
-
-Rig* rig = nullptr;
+EchoRig* rig = nullptr;
 
 // One blocking call; false, with the error's text in error, when it fails.
 bool Call(const char* service, const char* method, const std::string& argument,
@@ -108,17 +86,5 @@ BENCHMARK(BM_AddAndRefresh)->Arg(1)->Arg(10)->Arg(100)->Unit(benchmark::kMillise
 }  // namespace
 
 int main(int argc, char** argv) {
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
-    Rig theRig;
-    if (!theRig.Start()) {
-        return 1;
-    }
-    rig = &theRig;
-    benchmark::RunSpecifiedBenchmarks();
-    benchmark::Shutdown();
-    rig = nullptr;
-    return 0;
+    return vorn::bench::RunWithRig(argc, argv, rig);
 }

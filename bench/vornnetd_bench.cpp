@@ -11,19 +11,14 @@
 #include <sstream>
 #include <string>
 
-#include "support/private_bus.h"
-#include "support/sim_root.h"
+#include "echo_rig.h"
 
 namespace {
 
-using vorn::test::DaemonProcess;
 
-constexpr char kNetService[] = "com.tessarin.net";
-constexpr char kEchoService[] = "com.tessarin.bench.echo";
 constexpr char kRequest[] = R"({"type":"GTYPE_V4"})";
 // What vornnetd's route module answers on a fresh root: an empty list.
 constexpr char kNetAnswer[] = "[]\n";
-constexpr DaemonProcess::Timeout kStartTimeout{30000};
 constexpr int kCallTimeoutMs = 10000;
 
 // Resident memory in kB from /proc/PID/smaps_rollup; -1 where unreadable.
@@ -62,36 +57,15 @@ Memory ReadMemory(pid_t pid) {
     return memory;
 }
 
-using Connection = std::unique_ptr<GDBusConnection, decltype(&g_object_unref)>;
+using vorn::bench::EchoRig;
+using vorn::bench::kEchoService;
+using vorn::bench::kNetService;
 
-// The bus, vornnetd on a fresh simulated root, the echo service, and this process's connection;
-// members go in reverse order, the connection before the bus.
-struct Rig {
-    vorn::test::PrivateBus bus;
-    vorn::test::SimRoot root;
-    DaemonProcess vornnetd{{VORN_BINARY_DIR "/daemons/vornnetd", "--foreground"}};
-    DaemonProcess echo{{VORN_ECHO_SERVICE}};
-    Memory busMemory;
-    Memory vornnetdMemory;
-    Memory echoMemory;
-    Connection connection{nullptr, &g_object_unref};
-
-    bool Start() {
-        if (!bus.Started() || !vornnetd.WaitForBusName(kNetService, kStartTimeout) ||
-            !echo.WaitForBusName(kEchoService, kStartTimeout)) {
-            std::fprintf(stderr, "cannot start the rig:\n%s%s", vornnetd.Stderr().c_str(),
-                         echo.Stderr().c_str());
-            return false;
-        }
-        busMemory = ReadMemory(bus.Pid());
-        vornnetdMemory = ReadMemory(vornnetd.Pid());
-        echoMemory = ReadMemory(echo.Pid());
-        connection.reset(g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, nullptr));
-        return connection != nullptr;
-    }
-};
-
-Rig* rig = nullptr;
+EchoRig* rig = nullptr;
+// Each process's memory right after the rig started.
+Memory busMemory;
+Memory vornnetdMemory;
+Memory echoMemory;
 
 // One blocking call with the request text; the reply's text or the error reply's own message.
 std::string Call(const char* service, const char* method) {
@@ -154,26 +128,18 @@ void SetMemoryCounters(benchmark::State& state, const std::string& process, cons
 void BM_MemoryAfterStart(benchmark::State& state) {
     for (auto _ : state) {
     }
-    SetMemoryCounters(state, "vornnetd", rig->vornnetdMemory);
-    SetMemoryCounters(state, "echo", rig->echoMemory);
-    SetMemoryCounters(state, "dbus_daemon", rig->busMemory);
+    SetMemoryCounters(state, "vornnetd", vornnetdMemory);
+    SetMemoryCounters(state, "echo", echoMemory);
+    SetMemoryCounters(state, "dbus_daemon", busMemory);
 }
 BENCHMARK(BM_MemoryAfterStart)->Iterations(1);
 
 }  // namespace
 
 int main(int argc, char** argv) {
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
-    Rig theRig;
-    if (!theRig.Start()) {
-        return 1;
-    }
-    rig = &theRig;
-    benchmark::RunSpecifiedBenchmarks();
-    benchmark::Shutdown();
-    rig = nullptr;
-    return 0;
+    return vorn::bench::RunWithRig(argc, argv, rig, [](EchoRig& started) {
+        busMemory = ReadMemory(started.bus.Pid());
+        vornnetdMemory = ReadMemory(started.vornnetd.Pid());
+        echoMemory = ReadMemory(started.echo.Pid());
+    });
 }
