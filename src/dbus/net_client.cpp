@@ -38,7 +38,7 @@ int NetClient::CallForJson(const char* method, const std::string& argument, Json
     if (result != 0) {
         return result;
     }
-    if (!vornwireless::utils::ParseJson(reply, data)) {
+    if (!vornwireless::utils::ParseJson(reply, data, vornwireless::utils::kMaxJsonReplyLength)) {
         VORN_LOG(LOG_ERR, "%s", parseFailure);
         return -1;
     }

@@ -6,8 +6,8 @@
 namespace vornwireless {
 namespace utils {
 
-bool ParseJson(const std::string& text, Json::Value& value) {
-    if (text.size() > kMaxJsonTextLength) {
+bool ParseJson(const std::string& text, Json::Value& value, std::size_t maxLength) {
+    if (text.size() > maxLength) {
         return false;
     }
     Json::CharReaderBuilder builder;
