@@ -57,7 +57,12 @@ gboolean Forward(const Route& route, Json::Value& request, char** data, GError**
     }
     if (result != 0) {
         VORN_LOG(LOG_ERR, "%s", route.logText);
-        SetError(error, "error", route.errorText);
+        // A module that refused the request says why; the caller gets that too.
+        std::string text = route.errorText;
+        if (answer.isObject() && answer["error"].isString()) {
+            text += ": " + answer["error"].asString();
+        }
+        SetError(error, "error", text.c_str());
         return FALSE;
     }
     if (data != nullptr) {

@@ -42,7 +42,8 @@ constexpr const char* kStaticTable = "static";
 constexpr int kGatewayBuffer = 20;
 // A list that large is a runaway client; it would also outgrow what the file reader accepts.
 constexpr std::size_t kMaxEntries = 1024;
-constexpr std::size_t kMaxClassLength = 64;
+// A class is stored as given; only a runaway text is refused.
+constexpr std::size_t kMaxClassLength = 256;
 // More default routes than any table holds: output beyond it is not a count.
 constexpr long kMaxDefaultRoutes = 1024;
 
@@ -65,15 +66,16 @@ bool IsKnownType(GATEWAY_TYPE type) {
     return type == GTYPE_V4 || type == GTYPE_V6;
 }
 
-// Checked reads of request keys: a key of the wrong type reads as absent, never throws.
+// Checked reads of request keys: scalars convert as jsoncpp converts them, anything else reads as
+// absent; nothing throws.
 std::string Text(const Json::Value& request, const char* key) {
     const Json::Value& value = request[key];
-    return value.isString() ? value.asString() : std::string();
+    return value.isConvertibleTo(Json::stringValue) ? value.asString() : std::string();
 }
 
 bool Flag(const Json::Value& request, const char* key) {
     const Json::Value& value = request[key];
-    return value.isBool() && value.asBool();
+    return value.isConvertibleTo(Json::booleanValue) && value.asBool();
 }
 
 bool ReadType(const Json::Value& request, GATEWAY_TYPE& type) {
@@ -88,16 +90,9 @@ bool ReadType(const Json::Value& request, GATEWAY_TYPE& type) {
     return true;
 }
 
+// A line break or NUL would break the priority file apart.
 bool IsClassText(const std::string& text) {
-    if (text.size() > kMaxClassLength) {
-        return false;
-    }
-    for (const char c : text) {
-        if (static_cast<unsigned char>(c) < 0x20 || c == 0x7f) {
-            return false;
-        }
-    }
-    return true;
+    return text.size() <= kMaxClassLength && text.find_first_of(std::string("\n\r\0", 3)) == std::string::npos;
 }
 
 // An address of the request's family in its plain form, "NULL" (keep) or empty (clear).
@@ -115,49 +110,66 @@ bool IsAddressText(const Json::Value& request, const std::string& text) {
     return type == GTYPE_V6 ? ipv6 : ipv4;
 }
 
-bool IsWellFormedKey(const Json::Value& request, const std::string& key) {
+// Only what could do harm is refused: a name or address that reaches a command line and does not
+// parse, a text that would break a file apart, a priority that is no number.
+bool IsHarmlessKey(const Json::Value& request, const std::string& key) {
     const Json::Value& value = request[key];
     if (key == "ifname" || key == "interface_source" || key == "interface_destination") {
         return value.isString() && vornwireless::utils::IsValidInterfaceName(value.asString());
     }
     if (key == "priority") {
-        return value.isInt();
-    }
-    if (key == "refresh" || key == "slave" || key == "interface_source_delete") {
-        return value.isBool();
+        return value.isConvertibleTo(Json::intValue);
     }
     if (key == "gateway" || key == "dns") {
         return value.isString() && IsAddressText(request, value.asString());
     }
     if (key == "class") {
-        return value.isString() && IsClassText(value.asString());
-    }
-    if (key == "type" || key == "method") {
-        return value.isString();
-    }
-    return true;  // keys of no meaning here pass through
-}
-
-// Whether every key the module reads has the right type and form, and the required ones are there;
-// a request failing this is refused before anything changes.
-bool IsWellFormed(const Json::Value& request, std::initializer_list<const char*> required) {
-    if (!request.isObject()) {
-        VORN_LOG(LOG_ERR, "Invalid request");
-        return false;
-    }
-    for (const char* key : required) {
-        if (!request.isMember(key)) {
-            VORN_LOG(LOG_ERR, "Missing key [%s] in request", key);
-            return false;
-        }
-    }
-    for (const std::string& key : request.getMemberNames()) {
-        if (!IsWellFormedKey(request, key)) {
-            VORN_LOG(LOG_ERR, "Invalid key [%s] in request", key.c_str());
-            return false;
-        }
+        return value.isConvertibleTo(Json::stringValue) && IsClassText(value.asString());
     }
     return true;
+}
+
+// Why a request must be refused before anything changes; empty when it may run. Logged.
+std::string RequestFault(const Json::Value& request, std::initializer_list<const char*> required) {
+    std::string fault;
+    if (!request.isObject()) {
+        fault = "Invalid request";
+    }
+    for (auto key = required.begin(); fault.empty() && key != required.end(); ++key) {
+        if (!request.isMember(*key)) {
+            fault = std::string("Missing key [") + *key + "] in request";
+        }
+    }
+    if (fault.empty()) {
+        for (const std::string& key : request.getMemberNames()) {
+            if (!IsHarmlessKey(request, key)) {
+                fault = "Invalid key [" + key + "] in request";
+                break;
+            }
+        }
+    }
+    if (!fault.empty()) {
+        VORN_LOG(LOG_ERR, "%s", fault.c_str());
+    }
+    return fault;
+}
+
+bool IsWellFormed(const Json::Value& request, std::initializer_list<const char*> required) {
+    return RequestFault(request, required).empty();
+}
+
+// The keys a method cannot do without.
+std::initializer_list<const char*> RequiredKeys(const std::string& method) {
+    static const std::initializer_list<const char*> kInterface = {"ifname"};
+    static const std::initializer_list<const char*> kCopy = {"interface_source",
+                                                             "interface_destination"};
+    if (method == "ADD_GATEWAY_DATA" || method == "DEL_GATEWAY_DATA") {
+        return kInterface;
+    }
+    if (method == "COPY_GATEWAY_DATA") {
+        return kCopy;
+    }
+    return {};
 }
 
 // Overwrites field from the request's key unless the key is absent or "NULL".
@@ -259,13 +271,32 @@ BaseModule* RouteModule::Create() {
 int RouteModule::ProcessRequest(const Json::Value& request, Json::Value& answer) {
     ModuleLock lock(*this);
     try {
-        if (IsWellFormed(request, {"method"})) {
-            Dispatch(request["method"].asString(), request, answer);
+        const std::string method = request.isObject() ? Text(request, "method") : std::string();
+        std::string fault = RequestFault(request, RequiredKeys(method));
+        if (fault.empty() && IsNewEntryBeyondLimit(method, request)) {
+            fault = "Too many gateways";
+            VORN_LOG(LOG_ERR, "%s", fault.c_str());
         }
+        if (!fault.empty()) {
+            // Operations that ran answer 0 whatever their result; a refused request never ran.
+            answer = Json::Value(Json::objectValue);
+            answer["error"] = fault;
+            return -1;
+        }
+        Dispatch(method, request, answer);
     } catch (const std::exception& error) {
         VORN_LOG(LOG_ERR, "Failed to process request: %s", error.what());
     }
     return 0;
+}
+
+bool RouteModule::IsNewEntryBeyondLimit(const std::string& method, const Json::Value& request) {
+    GATEWAY_TYPE type = GTYPE_V4;
+    if (method != "ADD_GATEWAY_DATA" || !ReadType(request, type)) {
+        return false;
+    }
+    const GatewayList& list = *SelectList(type);
+    return list.size() >= kMaxEntries && Find(list, Text(request, "ifname")) == list.size();
 }
 
 void RouteModule::Dispatch(const std::string& method, const Json::Value& request,
@@ -289,9 +320,6 @@ void RouteModule::Dispatch(const std::string& method, const Json::Value& request
 
 void RouteModule::RunAndRefresh(int (RouteModule::*operation)(const Json::Value&),
                                 const Json::Value& request) {
-    if (!IsWellFormed(request, {"ifname"})) {
-        return;
-    }
     (this->*operation)(request);
     if (Flag(request, "refresh")) {
         RefreshDefaultGateway(request);
@@ -356,7 +384,8 @@ int RouteModule::ReadGatewayListFromFile(GATEWAY_TYPE type) {
         VORN_LOG(LOG_ERR, "Failed to read config [%s]", file);
         return -1;
     }
-    // Section names come back in text order: "10" before "2".
+    // Section names come back in text order: "10" before "2". A re-read replaces the list.
+    GatewayList fresh;
     for (auto& section : config.GetKeyValues()) {
         ConfigSection::Section& keys = section.second;
         if (!vornwireless::utils::IsValidInterfaceName(keys["ifname"])) {
@@ -370,8 +399,9 @@ int RouteModule::ReadGatewayListFromFile(GATEWAY_TYPE type) {
         entry.dns = keys["dns"];
         entry.slave = keys["slave"] == "yes";
         entry.class_ = keys["class"];
-        list->push_back(entry);
+        fresh.push_back(entry);
     }
+    list->swap(fresh);
     return 0;
 }
 
@@ -454,7 +484,8 @@ int RouteModule::AddGatewayInfo(const Json::Value& request) {
     if (!IsWellFormed(request, {"ifname"})) {
         return -1;
     }
-    const int priority = request["priority"].asInt();
+    const Json::Value& priorityValue = request["priority"];
+    const int priority = priorityValue.isConvertibleTo(Json::intValue) ? priorityValue.asInt() : 0;
     GATEWAY_TYPE type = GTYPE_V4;
     if (!ReadType(request, type)) {
         VORN_LOG(LOG_ERR, "Unknown type to add info");

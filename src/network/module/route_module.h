@@ -67,8 +67,9 @@ class RouteModule : public BaseModule {
 
   private:
     void Dispatch(const std::string& method, const Json::Value& request, Json::Value& answer);
-    // Runs an operation and, when the request asks for it, a refresh after it. A request refused
-    // for a bad key refreshes nothing.
+    // Whether an add would grow a list already at its bound.
+    bool IsNewEntryBeyondLimit(const std::string& method, const Json::Value& request);
+    // Runs an operation and, when the request asks for it, a refresh after it.
     void RunAndRefresh(int (RouteModule::*operation)(const Json::Value&),
                        const Json::Value& request);
     GatewayList* SelectList(GATEWAY_TYPE type);
