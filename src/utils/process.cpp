@@ -1,40 +1,74 @@
 #include "utils/process.h"
 
-#include <algorithm>
-#include <cstdio>
+#include <dirent.h>
 
-#include "platform/shell_command.h"
-#include "utils/log.h"
+#include <cctype>
+#include <fstream>
+#include <memory>
+#include <string>
 
 namespace vornwireless {
 namespace utils {
 namespace {
 
-constexpr std::size_t kLineBytes = 1024;
+// The kernel keeps only this much of a program's name in /proc/PID/stat.
+constexpr std::size_t kCommLength = 15;
+// A program's file name is at most this long; longer text cannot be one.
+constexpr std::size_t kMaxNameLength = 255;
 
-bool IsSafeInSingleQuotes(const std::string& name) {
-    return !name.empty() && std::none_of(name.begin(), name.end(), [](char c) {
-        const unsigned char byte = static_cast<unsigned char>(c);
-        return c == '\'' || c == '\\' || byte < 0x20 || byte == 0x7F;
-    });
+// The file name of the program the process runs, from its first argument word.
+std::string ProgramName(const std::string& pid) {
+    std::ifstream stream("/proc/" + pid + "/cmdline", std::ios::binary);
+    std::string first;
+    std::getline(stream, first, '\0');
+    const std::size_t slash = first.rfind('/');
+    return slash == std::string::npos ? first : first.substr(slash + 1);
+}
+
+// Whether a live (not zombie) process runs exactly the named program.
+bool RunsProgram(const std::string& pid, const std::string& name) {
+    // "PID (comm) S ...": comm may hold blanks and parentheses, the state follows the last ')'.
+    std::ifstream stream("/proc/" + pid + "/stat");
+    std::string stat;
+    std::getline(stream, stat);
+    const std::size_t open = stat.find('(');
+    const std::size_t close = stat.rfind(')');
+    if (open == std::string::npos || close == std::string::npos || close < open ||
+        close + 2 >= stat.size() || stat[close + 2] == 'Z') {
+        return false;
+    }
+    const std::string comm = stat.substr(open + 1, close - open - 1);
+    if (name.size() <= kCommLength) {
+        return comm == name;
+    }
+    return comm == name.substr(0, kCommLength) && ProgramName(pid) == name;
+}
+
+bool IsPid(const char* text) {
+    for (; *text != '\0'; ++text) {
+        if (!std::isdigit(static_cast<unsigned char>(*text))) {
+            return false;
+        }
+    }
+    return true;
 }
 
 }  // namespace
 
 bool IsProcessAlive(const std::string& name) {
-    char command[kLineBytes];
-    const int length = std::snprintf(
-        command, sizeof(command), "/bin/ps -I | /bin/grep '%s' | /bin/grep -v grep", name.c_str());
-    if (!IsSafeInSingleQuotes(name) || length < 0 ||
-        static_cast<std::size_t>(length) >= sizeof(command)) {
-        VORN_LOG(LOG_ERR, "Refused process name of %zu bytes for a shell line", name.size());
+    if (name.empty() || name.size() > kMaxNameLength || name.find('/') != std::string::npos) {
         return false;
     }
-    std::string line;
-    if (vorn::platform::ReadShellCommandLine(command, line, kLineBytes) != 0) {
+    const std::unique_ptr<DIR, int (*)(DIR*)> proc(opendir("/proc"), &closedir);
+    if (!proc) {
         return false;
     }
-    return line.find(name) != std::string::npos;
+    while (const dirent* entry = readdir(proc.get())) {
+        if (IsPid(entry->d_name) && RunsProgram(entry->d_name, name)) {
+            return true;
+        }
+    }
+    return false;
 }
 
 }  // namespace utils

@@ -6,9 +6,9 @@
 namespace vornwireless {
 namespace utils {
 
-// True when the process list shows a process whose line holds name. A name that cannot sit
-// inside single quotes in a shell line (empty, a quote, a backslash, a control character) is
-// refused with false.
+// True when a live process of this host runs the program of exactly this file name ("vornnetd"
+// is not "vornnetdtool"). Processes are the host's, never the simulated root's: /proc is read
+// directly. An empty name or one holding '/' is never a program's.
 bool IsProcessAlive(const std::string& name);
 
 }  // namespace utils
