@@ -4,15 +4,11 @@
 #include <libgen.h>
 #include <unistd.h>
 
-#include <climits>
-#include <cstdio>
-#include <cstdlib>
 #include <fstream>
 #include <vector>
 
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
-#include "platform/shell_command.h"
 #include "utils/log.h"
 
 namespace vornwireless {
@@ -22,29 +18,8 @@ namespace {
 constexpr std::size_t kLineBytes = 1024;
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN;
 
-// How many entries the shell lists for path, which may be a pattern; -1 when it cannot tell.
-int CountMatches(const char* path) {
-    char command[kLineBytes];
-    const int length =
-        std::snprintf(command, sizeof(command), "/bin/ls %s 2>/dev/null | /usr/bin/wc -l",
-                      vorn::platform::ShellRootPath(path).c_str());
-    if (length < 0 || static_cast<std::size_t>(length) >= sizeof(command)) {
-        return -1;
-    }
-    std::string line;
-    if (vorn::platform::ReadShellCommandLine(command, line, kLineBytes) != 0) {
-        return -1;
-    }
-    char* end = nullptr;
-    const long count = std::strtol(line.c_str(), &end, 10);
-    if (end == line.c_str() || count < 0) {
-        return -1;
-    }
-    return count > INT_MAX ? INT_MAX : static_cast<int>(count);
-}
-
-// The real paths a logical path or pattern names. Programs run without a shell, so patterns such
-// as "/usr/vorn/etc/wifi/wifi_ap_*" are expanded here.
+// The real paths a logical path or pattern names; none, nothing is run. Programs run without a
+// shell, so patterns such as "/usr/vorn/etc/wifi/wifi_ap_*" are expanded here.
 std::vector<std::string> Expand(const char* path) {
     std::vector<std::string> matches;
     glob_t found;
@@ -55,9 +30,9 @@ std::vector<std::string> Expand(const char* path) {
     return matches;
 }
 
-bool RemoveTree(const char* path) {
+bool RemoveAll(const std::vector<std::string>& matches) {
     bool removed = true;
-    for (const auto& match : Expand(path)) {
+    for (const auto& match : matches) {
         removed = QLIBCExecl("/bin/rm", kExecFlags, "-rf", match.c_str(),
                              static_cast<const char*>(nullptr)) == 0 &&
                   removed;
@@ -65,10 +40,10 @@ bool RemoveTree(const char* path) {
     return removed;
 }
 
-bool CopyInto(const char* src, const std::string& directory) {
+bool CopyAll(const std::vector<std::string>& matches, const std::string& directory) {
     const std::string target = vorn::platform::RootPath(directory);
     bool copied = true;
-    for (const auto& match : Expand(src)) {
+    for (const auto& match : matches) {
         copied = QLIBCExecl("/bin/cp", kExecFlags, "-rf", match.c_str(), target.c_str(),
                             static_cast<const char*>(nullptr)) == 0 &&
                  copied;
@@ -87,16 +62,16 @@ void ResetFiles(const char* src, const char* dst) {
     if (src == nullptr || dst == nullptr) {
         return;
     }
-    if (CountMatches(dst) > 0 && !RemoveTree(dst)) {
+    if (!RemoveAll(Expand(dst))) {
         VORN_LOG(LOG_ERR, "Failed to remove [%s]", dst);
     }
-    if (CountMatches(src) > 0 && !CopyInto(src, DirectoryOf(dst))) {
+    if (!CopyAll(Expand(src), DirectoryOf(dst))) {
         VORN_LOG(LOG_ERR, "Failed to copy [%s] to [%s]", src, dst);
     }
 }
 
 void RemoveFiles(const char* path) {
-    if (path != nullptr && CountMatches(path) > 0 && !RemoveTree(path)) {
+    if (path != nullptr && !RemoveAll(Expand(path))) {
         VORN_LOG(LOG_ERR, "Failed to remove [%s]", path);
     }
 }
