@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "platform/root_path.h"
+#include "utils/log.h"
 
 namespace vorn {
 namespace platform {
@@ -39,6 +40,9 @@ int ReadShellCommandLines(const std::string& commandLine, std::vector<std::strin
             lines.push_back(piece.substr(0, piece.size() - 1));
         }
         partial = !ended;
+    }
+    if (lines.size() >= maxLines && std::fgets(buffer.data(), 2, pipe) != nullptr) {
+        VORN_LOG(LOG_WARNING, "Output of [%s] cut at %zu lines", commandLine.c_str(), maxLines);
     }
     const bool exitedWithZero = pclose(pipe) == 0;
     if (succeeded != nullptr) {

@@ -15,7 +15,7 @@ int ReadShellCommandLine(const std::string& commandLine, std::string& line,
                          std::size_t maxBytes = 1024);
 
 // Like ReadShellCommandLine, but keeps up to maxLines whole output lines (line ends removed);
-// a line longer than maxBytes is dropped, not split. 0, or -1 when the command could not be
+// a line longer than maxBytes is dropped, not split; output beyond maxLines is logged and dropped. 0, or -1 when the command could not be
 // started. succeeded, when given, tells whether the command exited with 0 (or was cut off at
 // maxLines, which may end it by a broken pipe).
 int ReadShellCommandLines(const std::string& commandLine, std::vector<std::string>& lines,

@@ -22,6 +22,8 @@ namespace module {
 namespace {
 
 constexpr const char* kArpCommand = "/sbin/arp -a";
+// The largest neighbour table the appliance keeps.
+constexpr std::size_t kMaxArpLines = 4096;
 constexpr const char* kLeaseFile = "/etc/dhcpd/dhcpd.conf.leases";
 constexpr const char* kNmbLookup = "/usr/vorn/bin/nmblookup -A ";
 constexpr const char* kNmbFilter =
@@ -60,7 +62,7 @@ ArpScanner* ArpScanner::Inst() {
 
 Json::Value ArpScanner::GetData() {
     UpdateArpTabe();
-    return GetClientList();
+    return GetFinishedList();
 }
 
 void ArpScanner::UpdateArpTabe() {
@@ -82,6 +84,7 @@ void* ArpScanner::WaitProcessFinish(void*) {
     } catch (const std::exception&) {
         VORN_LOG(LOG_ERR, "Error on get arp table");
     }
+    Inst()->PublishScan();
     pthread_detach(pthread_self());
     scanning_ = false;
     return nullptr;
@@ -93,7 +96,7 @@ int ArpScanner::GetArpTable() {
         return 0;
     }
     std::vector<std::string> lines;
-    if (vorn::platform::ReadShellCommandLines(kArpCommand, lines) != 0) {
+    if (vorn::platform::ReadShellCommandLines(kArpCommand, lines, kMaxArpLines) != 0) {
         const int error = errno;
         VORN_LOG(LOG_ERR, "Failed to execute cmd [%s], error(%d):(%s)", kArpCommand, error,
                  std::strerror(error));

@@ -21,6 +21,8 @@ namespace {
 
 constexpr const char* kInterfacesCommand = "/usr/bin/hostapd_cli interface";
 constexpr const char* kHostapdCli = "/usr/bin/hostapd_cli -i ";
+// 256 stations a radio, each a MAC line and a few dozen key lines.
+constexpr std::size_t kMaxStationLines = 256 * 64;
 constexpr const char* kIwDev = "/usr/sbin/iw dev ";
 constexpr const char* kStationPattern = "^([0-9a-fA-F][0-9a-fA-F]:){5}([0-9a-fA-F][0-9a-fA-F])$";
 constexpr int kLocalNetworkTopology = 1;  // codes above it serve a local network
@@ -105,7 +107,7 @@ int WifiScanner::GetStationByIfName(const std::string& ifname) {
     }
     const std::string command = kHostapdCli + ifname + " all_sta";
     std::vector<std::string> lines;
-    if (vorn::platform::ReadShellCommandLines(command, lines) != 0) {
+    if (vorn::platform::ReadShellCommandLines(command, lines, kMaxStationLines) != 0) {
         return LogCommandFailure(command);
     }
     for (const std::string& line : lines) {
