@@ -2,6 +2,7 @@
 
 #include <arpa/inet.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
@@ -110,6 +111,19 @@ std::vector<std::string> SplitSources(const std::string& list) {
     return sources;
 }
 
+// The listed sources followed by the added ones not yet listed: enabling again lists nothing twice.
+std::string WithSources(const std::string& listed, const std::string& added) {
+    std::string list = listed;
+    std::vector<std::string> known = SplitSources(listed);
+    for (const std::string& source : SplitSources(added)) {
+        if (std::find(known.begin(), known.end(), source) == known.end()) {
+            list += (list.empty() ? "" : ",") + source;
+            known.push_back(source);
+        }
+    }
+    return list;
+}
+
 const char* EnableKey(IP_TYPE type) {
     return type == IP_TYPE_V4 ? "enable" : "enable_v6";
 }
@@ -147,7 +161,8 @@ int WriteConfig(ConfigSection& config) {
     return 0;
 }
 
-// The id and the validated sources of a table's family, for its lookup rules.
+// The id and the valid sources of a table's family, for its lookup rules. A source that is not an
+// address (a hand-edited file) is skipped, so that the others can still be set and removed.
 int ReadLookupRule(IP_TYPE type, const std::string& table, std::string& id,
                    std::vector<std::string>& sources) {
     if (QLIBCFileExist(kMultiTableConfig) != 1) {
@@ -164,15 +179,16 @@ int ReadLookupRule(IP_TYPE type, const std::string& table, std::string& id,
     }
     const ConfigSection::Section section = config.GetKeyValues()[table];
     id = Value(section, "id");
-    sources = SplitSources(Value(section, SourceKey(type)));
-    if (TableId(id) < 0 || sources.size() > kMaxSources) {
+    if (TableId(id) < 0) {
         VORN_LOG(LOG_ERR, "Invalid table [%s] in [%s]", table.c_str(), kMultiTableConfig);
         return -1;
     }
-    for (const std::string& source : sources) {
-        if (!IsValidSource(type, source)) {
-            VORN_LOG(LOG_ERR, "Invalid source [%s] of [%s]", source.c_str(), table.c_str());
-            return -1;
+    sources.clear();
+    for (const std::string& source : SplitSources(Value(section, SourceKey(type)))) {
+        if (IsValidSource(type, source)) {
+            sources.push_back(source);
+        } else {
+            VORN_LOG(LOG_WARNING, "Invalid source [%s] of [%s]", source.c_str(), table.c_str());
         }
     }
     return 0;
@@ -609,7 +625,11 @@ int PolicyRoute::ConfigWrite(IP_TYPE type, const std::string& table, const std::
             config.AddKeyValue(table, "id", table == kStaticTable ? kStaticTableId : ++max_id_);
         }
         if (enable) {
-            sources = sources.empty() ? source : sources + "," + source;
+            sources = WithSources(sources, source);
+            if (SplitSources(sources).size() > kMaxSources) {
+                VORN_LOG(LOG_ERR, "Too many sources for [%s]", table.c_str());
+                return -1;
+            }
         } else {
             sources.clear();
         }
