@@ -33,7 +33,7 @@ struct Topology {
     const char* name;
     int code;
 };
-constexpr Topology kTopologies[] = {{"router", 3}, {"bridge", 2}, {"client", 1}};
+constexpr Topology kTopologies[] = {{"router", 3}, {"bridge", 2}, {"client", 1}, {"repeater", 4}};
 
 int Fail(int code) {
     QLIBCErrSet(code);

@@ -30,8 +30,8 @@ int QLIBNetIfLinkDownEvent(const char* ifname);
 int NetRoutetableHandler(int action, const char* ifname);
 
 /* The network topology, key "net_topology" of "/etc/vorninfo.conf", as a code (flags: 0):
- * "router" 3, "bridge" 2, "client" 1. Callers act on "above 1" (the appliance serves a local
- * network) and on 3 (it also runs the DHCP server). -1 when the key is missing
+ * "router" 3, "bridge" 2, "client" 1, "repeater" 4. Callers act on "above 1" (the appliance
+ * serves a local network) and on 3 (it also runs the DHCP server). -1 when the key is missing
  * (QLIBC_ERR_NOT_FOUND) or holds any other value (QLIBC_ERR_FORMAT). */
 int QLIBNetTopologyGet(int flags);
 
