@@ -51,6 +51,8 @@ constexpr int kReceiveBufferBytes = 4 * 1024 * 1024;
 constexpr int kMaxDrainReads = 1 << 16;
 constexpr int kIdleWaitMilliseconds = 6000;
 constexpr auto kReseedInterval = std::chrono::seconds(1);
+// What the hooks get for an interface without an IPv4 address.
+constexpr const char* kNoAddress = "none";
 constexpr int kMaxInterfaces = 32;
 constexpr std::size_t kMaxSeedLines = 1 << 16;
 constexpr std::size_t kMaxSeedLineBytes = 1024;
@@ -241,7 +243,7 @@ bool ParseIPv6AddressLine(const std::string& line, std::string* name, std::strin
 }  // namespace
 
 NetlinkModule::NetlinkModule(std::function<Clock::time_point()> now)
-    : BaseModule(MODULE_NETLINK), ipv4_("none"), link_(false), now_(std::move(now)) {}
+    : BaseModule(MODULE_NETLINK), ipv4_(kNoAddress), link_(false), now_(std::move(now)) {}
 
 NetlinkModule::~NetlinkModule() {
     if (polling_) {
@@ -364,7 +366,10 @@ int NetlinkModule::InitInterface() {
         const std::string name(record.name, strnlen(record.name, sizeof(record.name)));
         if (record.link == QLIB_NET_LINK_UP) {
             link_.Set(name, true);
-            ipv4_.Set(name, std::string(record.ipv4, strnlen(record.ipv4, sizeof(record.ipv4))));
+            // The platform gives an empty text for an interface up without an address; hooks
+            // are promised "none" for it.
+            const std::string ipv4(record.ipv4, strnlen(record.ipv4, sizeof(record.ipv4)));
+            ipv4_.Set(name, ipv4.empty() ? kNoAddress : ipv4);
         } else {
             link_.Set(name, false);
         }
