@@ -18,8 +18,8 @@ class ArpScanner : public ClientList {
   public:
     static ArpScanner* Inst();
 
-    // Starts a scan when none runs and returns the list as it is now: the result of a scan is
-    // seen by a later call.
+    // Starts a scan when none runs and answers with the last finished one (empty before the
+    // first has finished).
     Json::Value GetData();
     int Start() { return 0; }
     int Stop() { return 0; }

@@ -114,6 +114,7 @@ bool MergeEntry(Json::Value& list, const char* key, const std::string& text, con
 ClientList::ClientList() {
     pthread_mutex_init(&mutex, nullptr);
     EraseList();
+    finished_ = root;
 }
 
 ClientList::~ClientList() {
@@ -193,6 +194,16 @@ bool ClientList::EraseObject(const std::string& mac) {
 Json::Value ClientList::GetClientList() {
     ListLock lock(mutex);
     return root;
+}
+
+void ClientList::PublishScan() {
+    ListLock lock(mutex);
+    finished_ = root;
+}
+
+Json::Value ClientList::GetFinishedList() {
+    ListLock lock(mutex);
+    return finished_;
 }
 
 bool ClientList::WriteToFile(const std::string& path) {

@@ -32,6 +32,10 @@ class ClientList {
     void EraseList();
     bool EraseObject(const std::string& mac);
     Json::Value GetClientList();
+    // A scanner that runs in the background answers with its last finished scan: the working list
+    // is swapped in whole when a scan ends, so no caller sees a scan half done or just emptied.
+    void PublishScan();
+    Json::Value GetFinishedList();
 
     bool WriteToFile(const std::string& path);
     bool LoadClientList(const std::string& path);
@@ -55,6 +59,7 @@ class ClientList {
 
     pthread_mutex_t mutex;
     Json::Value root;
+    Json::Value finished_;
 };
 
 }  // namespace module

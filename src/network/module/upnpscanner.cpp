@@ -122,11 +122,7 @@ UpnpScanner* UpnpScanner::Inst() {
 
 Json::Value UpnpScanner::GetData() {
     BoardcastUpnp();
-    Json::Value found(Json::objectValue);
-    found["ClientList"] = Json::Value(Json::arrayValue);
-    ListLock lock(mutex);
-    found.swap(root);
-    return found;
+    return GetFinishedList();
 }
 
 int UpnpScanner::BoardcastUpnp() {
@@ -144,6 +140,7 @@ int UpnpScanner::BoardcastUpnp() {
 
 void* UpnpScanner::WaitBoardcastFinish(void* scannerPointer) {
     auto* scanner = static_cast<UpnpScanner*>(scannerPointer);
+    scanner->EraseList();
     if (scanner->StartUpnp() != 0) {
         VORN_LOG(LOG_ERR, "Error: cannot start upnp");
     } else {
@@ -156,6 +153,7 @@ void* UpnpScanner::WaitBoardcastFinish(void* scannerPointer) {
             VORN_LOG(LOG_ERR, "Error: cannot stop upnp");
         }
     }
+    scanner->PublishScan();
     searching_ = false;
     return nullptr;
 }

@@ -17,8 +17,8 @@ namespace module {
 
 // Finds UPnP devices by an SSDP search ("ssdp:all") and lists each one under the source address
 // of its answer, with the names its device description gives. A search runs on a short-lived
-// detached thread, at most one at a time; GetData hands over what the previous search found and
-// starts the next one.
+// detached thread, at most one at a time; GetData answers with what the last finished search found
+// and starts the next one.
 //
 // Answers and description documents come from the network: texts are bounded and cleaned, a
 // malformed document describes nothing, and the list holds at most kMaxDevices entries.
@@ -29,7 +29,7 @@ class UpnpScanner : public ClientList {
 
     static UpnpScanner* Inst();
 
-    // What was found since the last call (the list is emptied); starts a search when none runs.
+    // What the last finished search found; starts a search when none runs.
     Json::Value GetData();
     int Start() { return 0; }
     void Stop() {}
