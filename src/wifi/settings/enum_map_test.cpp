@@ -1,0 +1,67 @@
+#include "wifi/settings/enum_map.h"
+
+#include <gtest/gtest.h>
+
+#include "support/log_capture.h"
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+// Every value of the table survives a trip through its string.
+template <typename E>
+void ExpectRoundTrips() {
+    for (const auto& row : EnumMap<E>::GetTable()) {
+        EXPECT_EQ(EnumMap<E>::StringToEnum(EnumMap<E>::EnumToString(row.second)), row.second)
+            << row.first;
+    }
+}
+
+TEST(EnumMapTest, ValuesStringsAndAliases) {
+    vorn::test::LogCapture log;
+    ExpectRoundTrips<WIFI_MODE>();
+    ExpectRoundTrips<WIFI_ENCRYPTION>();
+    ExpectRoundTrips<WIFI_SECURITY>();
+    ExpectRoundTrips<WIFI_MAC_FILTER_POLICY>();
+    ExpectRoundTrips<WIFI_POWER>();
+    ExpectRoundTrips<WIFI_BANDWIDTH>();
+    ExpectRoundTrips<WIFI_TOPOLOGY>();
+    ExpectRoundTrips<WIFI_DRIVER>();
+    ExpectRoundTrips<WIFI_STATUS>();
+    ExpectRoundTrips<WIFI_FEATURE>();
+    ExpectRoundTrips<WIFI_OPMODE>();
+    EXPECT_TRUE(log.Lines().empty());
+
+    EXPECT_EQ(EnumMap<WIFI_MODE>::StringToEnum("an"), 5);
+    EXPECT_EQ(EnumMap<WIFI_MODE>::StringToEnum("gn"), 7);
+    EXPECT_EQ(EnumMap<WIFI_MODE>::EnumToString(WIFI_MODE(11)), "an+ac");
+    EXPECT_EQ(EnumMap<WIFI_MODE>::EnumToString(WIFI_MODE(12)), "error");
+    EXPECT_EQ(EnumMap<WIFI_POWER>::EnumToString(WIFI_POWER(6)), "medium");
+    EXPECT_EQ(EnumMap<WIFI_POWER>::EnumToString(WIFI_POWER(5)), "error");
+    EXPECT_EQ(EnumMap<WIFI_STATUS>::EnumToString(WIFI_STATUS(2)), "IPConflict");
+    EXPECT_EQ(EnumMap<WIFI_STATUS>::StringToEnum("IPFailed"), 3);
+    EXPECT_EQ(EnumMap<WIFI_TOPOLOGY>::StringToEnum("repeater"), 4);
+
+    // Aliases parse; the key-order walk answers with the byte-wise first alias.
+    for (const char* word : {"Managed", "Infra", "In", "Any"}) {
+        EXPECT_EQ(EnumMap<WIFI_OPMODE>::StringToEnum(word), WIFI_OPMODE_MANAGED) << word;
+    }
+    EXPECT_EQ(EnumMap<WIFI_OPMODE>::StringToEnum("Adhoc"), WIFI_OPMODE_AD_HOC);
+    const char* expected[] = {"Auto", "Ad", "Any", "Master", "Repeater", "Secondary", "Monitor"};
+    for (int value = 0; value <= 6; ++value) {
+        EXPECT_EQ(EnumMap<WIFI_OPMODE>::EnumToString(WIFI_OPMODE(value)), expected[value]);
+    }
+    EXPECT_TRUE(log.Lines().empty());
+
+    // Lookups are exact; a miss logs and yields the table's error value.
+    EXPECT_EQ(EnumMap<WIFI_ENCRYPTION>::StringToEnum("AES"), 3);
+    EXPECT_EQ(EnumMap<WIFI_ENCRYPTION>::StringToEnum("aes"), 0);
+    EXPECT_EQ(EnumMap<WIFI_OPMODE>::StringToEnum("Mesh"), -1);
+    EXPECT_EQ(log.Lines(), (std::vector<std::string>{
+                               "libvornwireless/include/wifi/enum:286 Failed to find key(aes)",
+                               "libvornwireless/include/wifi/enum:286 Failed to find key(Mesh)"}));
+}
+
+}  // namespace
+}  // namespace wifi
+}  // namespace vornwireless
