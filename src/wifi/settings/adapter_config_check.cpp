@@ -1,0 +1,98 @@
+#include "wifi/settings/adapter_config_check.h"
+
+#include <algorithm>
+#include <set>
+#include <string>
+
+#include "utils/interface_name.h"
+#include "utils/log.h"
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+constexpr std::size_t kMaxSsidLength = 32;
+constexpr std::size_t kMinPassphrase = 8;
+constexpr std::size_t kMaxPassphrase = 63;
+constexpr std::size_t kHexKeyLength = 64;
+
+bool IsOneLine(const std::string& text) {
+    return text.find_first_of(std::string("\n\r\0", 3)) == std::string::npos;
+}
+
+bool IsPersonalWpa(WIFI_SECURITY security) {
+    return security == WIFI_SECURITY_PERSONAL_WPA || security == WIFI_SECURITY_PERSONAL_WPA2 ||
+           security == WIFI_SECURITY_PERSONAL_WPA_MIXED;
+}
+
+bool IsPassphrase(const std::string& text) {
+    if (text.size() == kHexKeyLength) {
+        return std::all_of(text.begin(), text.end(),
+                           [](char c) { return std::isxdigit(static_cast<unsigned char>(c)); });
+    }
+    return text.size() >= kMinPassphrase && text.size() <= kMaxPassphrase &&
+           std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; });
+}
+
+// Collects the first refusal; later checks only run while none has been found.
+class Checker {
+  public:
+    void Text(const char* field, const std::string& text) {
+        Require(IsOneLine(text), field, "holds a line break, carriage return or NUL");
+    }
+    void Ssid(const char* field, const std::string& text) {
+        Text(field, text);
+        Require(text.size() <= kMaxSsidLength, field, "is longer than 32 bytes");
+    }
+    void Mac(const char* field, const vornwireless::utils::MacAddress& mac) {
+        Require(mac.IsFormalized(), field, "is not a MAC address");
+    }
+    void Passphrase(const char* field, const std::string& text, bool used) {
+        Text(field, text);
+        Require(!used || IsPassphrase(text), field, "is not a WPA passphrase");
+    }
+    void Require(bool ok, const char* field, const char* why) {
+        if (ok_ && !ok) {
+            VORN_LOG(LOG_ERR, "Refused config: %s %s", field, why);
+            ok_ = false;
+        }
+    }
+    bool Ok() const { return ok_; }
+
+  private:
+    bool ok_ = true;
+};
+
+}  // namespace
+
+int CheckAdapterConfig(const AdapterConfig& config) {
+    Checker check;
+    check.Require(vornwireless::utils::IsValidInterfaceName(config.name), "name",
+                  "is not an interface name");
+    check.Mac("bssid", config.bssid);
+    check.Ssid("ssid", config.ssid);
+    check.Text("CountryCode", config.CountryCode);
+    check.Passphrase("password", config.password, config.enabled && IsPersonalWpa(config.security));
+    check.Text("auth_server_shared_secret", config.auth_server_shared_secret);
+    check.Ssid("guest_ssid", config.guest_ssid);
+    check.Mac("guest_bssid", config.guest_bssid);
+    check.Passphrase("guest_password", config.guest_password,
+                     config.guest_enabled && IsPersonalWpa(config.guest_security));
+    for (const auto& rule : config.mac_filter_rules) {
+        check.Mac("mac_filter_rules.mac", rule.mac);
+        check.Text("mac_filter_rules.desc", rule.desc);
+    }
+    std::set<std::string> bssids;
+    for (const auto& station : config.stations) {
+        check.Ssid("stations.essid", station.essid);
+        check.Mac("stations.bssid", station.bssid);
+        check.Require(bssids.insert(station.bssid.ToString()).second, "stations.bssid",
+                      "is repeated");
+        check.Text("stations.user", station.user);
+        check.Passphrase("stations.password", station.password, IsPersonalWpa(station.security));
+    }
+    return check.Ok() ? 0 : -1;
+}
+
+}  // namespace wifi
+}  // namespace vornwireless

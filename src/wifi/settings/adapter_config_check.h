@@ -1,0 +1,20 @@
+#ifndef VORN_WIFI_SETTINGS_ADAPTER_CONFIG_CHECK_H
+#define VORN_WIFI_SETTINGS_ADAPTER_CONFIG_CHECK_H
+
+#include "wifi/settings/adapter_config.h"
+
+namespace vornwireless {
+namespace wifi {
+
+// Whether a configuration from outside may reach the generated files (section files, hostapd,
+// wpa_supplicant). Refused, with a log line naming the field: a text holding a line break, a
+// carriage return or a NUL byte; an SSID over 32 bytes; a MAC not in canonical form; a repeated
+// station BSSID (stations are stored by it); a personal-WPA passphrase that is not 8 to 63
+// printable characters or 64 hex digits, checked where it is used (the main network when
+// enabled, the guest network when enabled, every station). 0 or -1.
+int CheckAdapterConfig(const AdapterConfig& config);
+
+}  // namespace wifi
+}  // namespace vornwireless
+
+#endif
