@@ -15,9 +15,7 @@
 #include "support/sim_root.h"
 #include "utils/json_text.h"
 
-namespace vornnetwork {
-namespace network {
-namespace module {
+namespace vornnetwork::network::module {
 namespace {
 
 using ::testing::AllOf;
@@ -53,6 +51,12 @@ Bytes Advert(std::uint8_t flags, const std::vector<Bytes>& options) {
     return packet;
 }
 
+Json::Value Parse(const char* text) {
+    Json::Value value;
+    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
+    return value;
+}
+
 class IPv6ModuleTest : public vorn::test::RootTest {
   protected:
     void SetUp() override {
@@ -75,6 +79,11 @@ class IPv6ModuleTest : public vorn::test::RootTest {
     InterfaceContext Context(const std::string& ifname) const {
         return module_.GetContexts()[ifname];
     }
+    int Mode(const char* ifname) {
+        VORN_NET_IPV6_CONFIG config;
+        EXPECT_EQ(VORNNetIPv6ConfGet(ifname, &config), 0);
+        return config.type == VORN_NET_IPV6_TYPE_AUTO ? config.mode : -1;
+    }
     void Receive(const Bytes& packet, const char* sender = "fe80::1",
                  unsigned int index = if_nametoindex("lo")) {
         sockaddr_in6 from{};
@@ -96,54 +105,37 @@ TEST_F(IPv6ModuleTest, AppliesEachChangeOnce) {
     EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::1 dev eth0",
                                          "/etc/rc.network ipv6-restart eth0"));
     EXPECT_THAT(root_.ReadFile("/etc/iproute2/config/gateway_v6_priority"),
-                AllOf(HasSubstr("gateway=fe80::1"), HasSubstr("ifname=eth0")));
-    EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
-                AllOf(HasSubstr("IPV6_AUTOCONF=yes\n"), HasSubstr("DHCPV6C=no\n")));
+                HasSubstr("gateway=fe80::1\n\tifname=eth0\n"));
     EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_AUTOCONF);
-
     module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
     EXPECT_THAT(TakeCalls(), IsEmpty());
 
     module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, true);
     EXPECT_THAT(TakeCalls(), ElementsAre(HasSubstr("route add"), HasSubstr("ipv6-restart eth0")));
-    EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
-                AllOf(HasSubstr("IPV6_AUTOCONF=yes\n"), HasSubstr("DHCPV6C=yes\n"),
-                      HasSubstr("DHCPV6C_OPTIONS=-S\n")));
-    VORN_NET_IPV6_CONFIG config;
-    ASSERT_EQ(VORNNetIPv6ConfGet("eth0", &config), 0);
-    EXPECT_EQ(config.type, VORN_NET_IPV6_TYPE_AUTO);
-    EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_OTHER);
-
+    EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"), HasSubstr("DHCPV6C=yes\nDHCPV6C_OPTIONS=-S\n"));
+    EXPECT_EQ(Mode("eth0"), VORN_NET_IPV6_MODE_OTHER);
     // A new prefix applies again, even with the same flags.
     module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", false, true);
     EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::2 dev eth0",
                                          "/etc/rc.network ipv6-restart eth0"));
 
     Json::Value answer;
-    Json::Value reset;
-    reset["method"] = "RESET_IPV6_MODULE";
-    reset["ifname"] = "eth0";
-    EXPECT_EQ(module_.ProcessRequest(reset, answer), 0);
+    EXPECT_EQ(
+        module_.ProcessRequest(Parse(R"({"method":"RESET_IPV6_MODULE","ifname":"eth0"})"), answer),
+        0);
     EXPECT_EQ(module_.GetContexts().count("eth0"), 0u);
-    module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", false, true);
+    module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", true, true);  // both flags: managed
     EXPECT_THAT(TakeCalls(), ElementsAre(HasSubstr("route add"), HasSubstr("ipv6-restart eth0")));
-
-    // Both flags: managed.
-    module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", true, true);
     EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_MANAGED);
     EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
                 AllOf(HasSubstr("IPV6_AUTOCONF=no\n"), HasSubstr("DHCPV6C=yes\n"),
-                      Not(HasSubstr("DHCPV6C_OPTIONS"))));
-    ASSERT_EQ(VORNNetIPv6ConfGet("eth0", &config), 0);
-    EXPECT_EQ(config.type, VORN_NET_IPV6_TYPE_AUTO);
-    EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_MANAGED);
+                      Not(HasSubstr("OPTIONS"))));
+    EXPECT_EQ(Mode("eth0"), VORN_NET_IPV6_MODE_MANAGED);
 
     // Requests of other shapes change nothing and still answer 0.
     for (const char* bad :
          {"[]", "\"x\"", "{\"method\":1}", "{\"method\":\"RESET_IPV6_MODULE\"}"}) {
-        Json::Value request;
-        ASSERT_TRUE(vornwireless::utils::ParseJson(bad, request)) << bad;
-        EXPECT_EQ(module_.ProcessRequest(request, answer), 0) << bad;
+        EXPECT_EQ(module_.ProcessRequest(Parse(bad), answer), 0);
     }
     EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_MANAGED);
 }
@@ -156,37 +148,30 @@ TEST_F(IPv6ModuleTest, RoutersAndUnmanagedInterfacesAreNeverApplied) {
     module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
     root_.ClearCalls();
     root_.WriteFile(kIfcfg + "eth0", std::string(kAutoconf) + "IPV6ROUTER=yes-please\n");
-    for (const char* ifname : {"lbr0", "eth0", "eth1", "eth2", "eth3"}) {
+    for (const char* ifname : {"lbr0", "eth0", "eth1", "eth2", "eth3", "eth9"}) {
         module_.ProcessRA("fe80::1", "2001:db8:1::", ifname, true, false);
-        EXPECT_EQ(Context(ifname).prefix, "") << ifname;
         EXPECT_EQ(Context(ifname).state, InterfaceContext::STATE_NONE) << ifname;
     }
     EXPECT_THAT(TakeCalls(), IsEmpty());
-
-    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth9", false, false);
     EXPECT_TRUE(log_.Contains("ipv6_module.cpp:"));
     EXPECT_TRUE(log_.Contains("Fail to get ipv6 config(eth9)"));
-    EXPECT_EQ(module_.GetContexts().count("eth9"), 0u);
-    EXPECT_THAT(TakeCalls(), IsEmpty());
-}
 
-TEST_F(IPv6ModuleTest, FailedRegistrationStillSwitchesTheMode) {
+    // A failed registration still switches the mode.
     manager_->RemoveModule(MODULE_ROUTE);
-    module_.ProcessRA("fe80::1", "", "eth0", true, false);
-    EXPECT_TRUE(log_.Contains("Failed to add gateway data ifname=eth0, gateway=fe80::1"));
-    EXPECT_THAT(TakeCalls(), ElementsAre("/etc/rc.network ipv6-restart eth0"));
+    root_.WriteFile(kIfcfg + "eth5", kAutoconf);
+    module_.ProcessRA("fe80::1", "", "eth5", true, false);
+    EXPECT_TRUE(log_.Contains("Failed to add gateway data ifname=eth5, gateway=fe80::1"));
+    EXPECT_THAT(TakeCalls(), ElementsAre("/etc/rc.network ipv6-restart eth5"));
 }
 
 TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixInterfaceAndFlags) {
     root_.WriteFile(kIfcfg + "lo", kAutoconf);
     Receive(
         Advert(kManaged | kOther, {PrefixOption("2001:db8:7::"), PrefixOption("2001:db8:9::")}));
-    EXPECT_EQ(module_.AdvertisementsHandled(), 1u);
     EXPECT_EQ(Context("lo").prefix, "2001:db8:9::");
     EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_MANAGED);
     EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::1 dev lo",
                                          "/etc/rc.network ipv6-restart lo"));
-
     Receive(Advert(kOther, {}));
     EXPECT_EQ(Context("lo").prefix, "");
     EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_OTHER);
@@ -203,13 +188,9 @@ TEST_F(IPv6ModuleTest, MalformedPacketsAreDroppedWhole) {
         Receive(Bytes(good.begin(), good.begin() + static_cast<std::ptrdiff_t>(len)));
     }
     EXPECT_EQ(module_.AdvertisementsHandled(), 3u);  // 16, 24 and 56 bytes
-    EXPECT_TRUE(log_.Contains("received icmpv6 packet with invalid length: 7"));
-    EXPECT_TRUE(log_.Contains("received router advertisement with invalid length: 15"));
     EXPECT_TRUE(log_.Contains("truncated option in RA (len 1)"));
     EXPECT_TRUE(
         log_.Contains("option length greater than total length in RA (type 3, optlen 32, len 31)"));
-    EXPECT_TRUE(
-        log_.Contains("option length greater than total length in RA (type 1, optlen 8, len 7)"));
 
     log_.Clear();
     root_.ClearCalls();
@@ -225,12 +206,8 @@ TEST_F(IPv6ModuleTest, MalformedPacketsAreDroppedWhole) {
     EXPECT_EQ(module_.AdvertisementsHandled(), 3u);
     EXPECT_THAT(TakeCalls(), IsEmpty());
     EXPECT_EQ(log_.Matching("zero length option in RA").size(), 1u);
-    EXPECT_TRUE(log_.Contains("prefix option too short in RA (optlen 8)"));
-    EXPECT_TRUE(log_.Contains("prefix option too short in RA (optlen 24)"));
-    EXPECT_TRUE(log_.Contains("Invalid router advertisement from 2001:db8::1 (code 0)"));
-    EXPECT_TRUE(log_.Contains("Failed to get interface name of index 2147483647"));
-    EXPECT_TRUE(log_.Contains("Invalid router advertisement from fe80::1 (code 1)"));
-    EXPECT_TRUE(log_.Contains("icmpv6 filter failed"));
+    EXPECT_EQ(log_.Matching("prefix option too short in RA").size(), 2u);
+    EXPECT_EQ(log_.Matching("Invalid router advertisement from").size(), 2u);
 }
 
 TEST_F(IPv6ModuleTest, PacketInformationIsChecked) {
@@ -245,24 +222,17 @@ TEST_F(IPv6ModuleTest, PacketInformationIsChecked) {
     in6_pktinfo info{};
     info.ipi6_ifindex = 11;
     std::memcpy(CMSG_DATA(header), &info, sizeof(info));
-    const in6_pktinfo* found = IPv6Module::FindPacketInfo(message);
-    ASSERT_NE(found, nullptr);
-    EXPECT_EQ(found->ipi6_ifindex, 11u);
+    ASSERT_NE(IPv6Module::FindPacketInfo(message), nullptr);
+    EXPECT_EQ(IPv6Module::FindPacketInfo(message)->ipi6_ifindex, 11u);
 
     info.ipi6_ifindex = 0;
     std::memcpy(CMSG_DATA(header), &info, sizeof(info));
     EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
-    const std::string bogus = "received a bogus IPV6_PKTINFO from the kernel! len=" +
-                              std::to_string(CMSG_LEN(sizeof(in6_pktinfo)));
-    EXPECT_TRUE(log_.Contains(bogus + ", index=0\n"));
-
     header->cmsg_len = CMSG_LEN(sizeof(int));
     EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
-    EXPECT_TRUE(log_.Contains("received a bogus IPV6_PKTINFO from the kernel! len=" +
-                              std::to_string(CMSG_LEN(sizeof(int))) + ", index=0"));
-
     message.msg_controllen = 0;
     EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
+    EXPECT_EQ(log_.Matching("received a bogus IPV6_PKTINFO from the kernel! len=").size(), 2u);
     EXPECT_TRUE(log_.Contains("received no IPV6_PKTINFO from the kernel"));
 }
 
@@ -282,30 +252,17 @@ TEST_F(IPv6ModuleTest, ListeningThreadEndsWithTheModule) {
 
 TEST_F(IPv6ModuleTest, PlatformConfigurationOfAnInterface) {
     VORN_NET_IPV6_CONFIG config;
-    const std::vector<std::pair<std::string, int>> files = {
-        {"", VORN_NET_IPV6_TYPE_OFF},
-        {"IPV6INIT=no\nIPV6_AUTOCONF=yes\n", VORN_NET_IPV6_TYPE_OFF},
-        {"IPV6INIT=YES\n", VORN_NET_IPV6_TYPE_AUTO},
-        {"IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\nIPV6_AUTOCONF=yes\n", VORN_NET_IPV6_TYPE_AUTO},
-        {"IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\n", VORN_NET_IPV6_TYPE_STATIC},
-        {"IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\nIPV6FORWARDING=yes\n", VORN_NET_IPV6_TYPE_ROUTER},
-    };
-    for (const auto& file : files) {
-        root_.WriteFile(kIfcfg + "eth1", file.first);
-        ASSERT_EQ(VORNNetIPv6ConfGet("eth1", &config), 0) << file.first;
-        EXPECT_EQ(config.type, file.second) << file.first;
-        EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_AUTOCONF) << file.first;
-    }
-    root_.WriteFile(kIfcfg + "eth1", "IPV6INIT=yes\nDHCPV6C=yes\nDHCPV6C_OPTIONS=\"-v -S\"\n");
+    root_.WriteFile(kIfcfg + "eth1", "IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\nIPV6FORWARDING=yes\n");
     ASSERT_EQ(VORNNetIPv6ConfGet("eth1", &config), 0);
-    EXPECT_EQ(config.mode, VORN_NET_IPV6_MODE_OTHER);
+    EXPECT_EQ(config.type, VORN_NET_IPV6_TYPE_ROUTER);
+    root_.WriteFile(kIfcfg + "eth1", "IPV6INIT=yes\nDHCPV6C=yes\nDHCPV6C_OPTIONS=\"-v -S\"\n");
+    EXPECT_EQ(Mode("eth1"), VORN_NET_IPV6_MODE_OTHER);
     EXPECT_EQ(VORNNetIPv6ConfGet("eth9", &config), -1);
     EXPECT_EQ(VORNNetIPv6ConfGet("../ifcfg-eth1", &config), -1);
 
     EXPECT_EQ(VORNNetIPv6ConfSet(1, "eth1", 0, 0, 0), -1);
     EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth9", 0, 0, 0), -1);
     EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth1;reboot", 0, 0, 0), -1);
-    EXPECT_FALSE(root_.Exists(kIfcfg + "eth9"));
     EXPECT_THAT(root_.Calls(), IsEmpty());
     ASSERT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_AUTOCONF, "eth1", 0, 0, 0), 0);
     EXPECT_EQ(root_.ReadFile(kIfcfg + "eth1"), "IPV6INIT=yes\nDHCPV6C=no\nIPV6_AUTOCONF=yes\n");
@@ -314,6 +271,4 @@ TEST_F(IPv6ModuleTest, PlatformConfigurationOfAnInterface) {
 }
 
 }  // namespace
-}  // namespace module
-}  // namespace network
-}  // namespace vornnetwork
+}  // namespace vornnetwork::network::module

@@ -2,20 +2,19 @@
 
 #include <gmock/gmock.h>
 
-#include <algorithm>
 #include <string>
 #include <thread>
 #include <vector>
 
+#include "network/utils.h"
 #include "support/sim_root.h"
 #include "utils/json_text.h"
 
-namespace vornnetwork {
-namespace network {
-namespace module {
+namespace vornnetwork::network::module {
 namespace {
 
 using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 
 constexpr char kV4File[] = "/etc/iproute2/config/gateway_v4_priority";
@@ -24,6 +23,14 @@ constexpr char kDatabase[] = "/etc/iproute2/config/gateway_database";
 constexpr char kResolv4[] = "/etc/iproute2/config/resolv4.conf";
 constexpr char kResolv6[] = "/etc/iproute2/config/resolv6.conf";
 
+std::vector<std::string> Names(const RouteModule& module, GATEWAY_TYPE type) {
+    std::vector<std::string> names;
+    for (const GatewayInfo& entry : module.GetList(type)) {
+        names.push_back(entry.ifname);
+    }
+    return names;
+}
+
 class RouteModuleTest : public vorn::test::RootTest {
   protected:
     // Sends a request written as JSON text; its answer.
@@ -31,7 +38,7 @@ class RouteModuleTest : public vorn::test::RootTest {
         Json::Value request;
         EXPECT_TRUE(vornwireless::utils::ParseJson(text, request)) << text;
         Json::Value answer;
-        EXPECT_EQ(module_.ProcessRequest(request, answer), 0);
+        EXPECT_EQ(module_.ProcessRequest(request, answer), 0) << text;
         return answer;
     }
     void Add(const char* type, const std::string& ifname, int priority,
@@ -39,13 +46,11 @@ class RouteModuleTest : public vorn::test::RootTest {
         Send(std::string(R"({"method":"ADD_GATEWAY_DATA","type":")") + type + R"(","ifname":")" +
              ifname + R"(","priority":)" + std::to_string(priority) + more + "}");
     }
-    std::vector<std::string> Names(GATEWAY_TYPE type) const {
-        std::vector<std::string> names;
-        for (const GatewayInfo& entry : module_.GetList(type)) {
-            names.push_back(entry.ifname);
-        }
-        return names;
+    void Slave(const char* ifname, bool slave) {
+        Send(std::string(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":")") + ifname +
+             R"(","slave":)" + (slave ? "true}" : "false}"));
     }
+    std::vector<std::string> Names(GATEWAY_TYPE type) const { return module::Names(module_, type); }
     std::string Files() const {
         std::string all;
         for (const char* file : {kV4File, kV6File, kDatabase, kResolv4, kResolv6}) {
@@ -57,14 +62,11 @@ class RouteModuleTest : public vorn::test::RootTest {
     RouteModule module_;
 };
 
-TEST_F(RouteModuleTest, PrioritiesPlaceEntries) {
+TEST_F(RouteModuleTest, PrioritiesSlavesAndCopiesPlaceEntries) {
     Add("GTYPE_V4", "eth1", 0);
     Add("GTYPE_V4", "eth0", 0);
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth0", "eth1"));
     // -2 keeps an entry where it stands and merges the new fields.
     Add("GTYPE_V4", "eth0", -2, R"(,"gateway":"10.0.0.1")");
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth0", "eth1"));
-    EXPECT_EQ(module_.GetList(GTYPE_V4)[0].gateway.ToString(), "10.0.0.1");
     Add("GTYPE_V4", "eth2", -2);
     Add("GTYPE_V4", "eth3", 3);
     Add("GTYPE_V4", "eth4", 99);
@@ -74,65 +76,48 @@ TEST_F(RouteModuleTest, PrioritiesPlaceEntries) {
                 ElementsAre("eth0", "eth6", "eth1", "eth2", "eth3", "eth4", "eth5"));
     Add("GTYPE_V4", "eth0", -1);
     Add("GTYPE_V4", "eth5", 0);
-    EXPECT_THAT(Names(GTYPE_V4),
-                ElementsAre("eth5", "eth6", "eth1", "eth2", "eth3", "eth4", "eth0"));
-    EXPECT_THAT(Names(GTYPE_V6), IsEmpty());
-
     Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth6"})");
     Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth9"})");
     EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth5", "eth1", "eth2", "eth3", "eth4", "eth0"));
+    EXPECT_THAT(Names(GTYPE_V6), IsEmpty());
     const Json::Value list = Send(R"({"method":"GET_GATEWAY_LIST_DATA","type":"GTYPE_V4"})");
     ASSERT_EQ(list.size(), 6u);
     EXPECT_EQ(list[5]["priority"].asInt(), 5);
-    EXPECT_EQ(list[5]["ifname"].asString(), "eth0");
     EXPECT_EQ(list[5]["gateway"].asString(), "10.0.0.1");
-    EXPECT_EQ(Send(R"({"method":"GET_GATEWAY_LIST_DATA","type":"GTYPE_V6"})"),
-              Json::Value(Json::arrayValue));
+
+    // Slaves go last; a copy takes the source's place, after the old destination entry goes.
+    Slave("eth5", true);
+    Slave("eth1", false);
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "eth3", "eth4", "eth0", "eth5"));
+    const std::string files = Files();
+    Slave("eth7", true);
+    EXPECT_EQ(Files(), files);
+    Send(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth0",)"
+         R"("interface_destination":"bond0"})");
+    EXPECT_THAT(Names(GTYPE_V4),
+                ElementsAre("eth1", "eth2", "eth3", "eth4", "bond0", "eth0", "eth5"));
+    EXPECT_EQ(module_.GetList(GTYPE_V4)[4].gateway.ToString(), "10.0.0.1");
+    Send(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth5",)"
+         R"("interface_destination":"bond0","interface_source_delete":true})");
+    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "eth3", "eth4", "eth0", "bond0"));
+    EXPECT_TRUE(module_.GetList(GTYPE_V4)[5].slave);
+    EXPECT_THAT(root_.ReadFile(kDatabase), HasSubstr("[bond0]\n"));
 }
 
 TEST_F(RouteModuleTest, NullKeepsAFieldAndEmptyTextClearsIt) {
     Add("GTYPE_V4", "eth0", 0, R"(,"gateway":"10.0.0.1","dns":"10.0.0.53","class":"ethernet")");
     Add("GTYPE_V4", "eth0", -2, R"(,"gateway":"NULL","dns":"NULL","class":"NULL")");
-    Json::Value entry =
-        Send(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V4","ifname":"eth0"})");
-    EXPECT_EQ(vornwireless::utils::CompactJson(entry),
-              R"({"class":"ethernet","dns":"10.0.0.53","exist":true,"gateway":"10.0.0.1",)"
-              R"("ifname":"eth0","priority":0,"slave":false})");
     Add("GTYPE_V4", "eth0", -2, R"(,"gateway":"","class":"")");
-    entry = Send(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V4","ifname":"eth0"})");
-    EXPECT_EQ(entry["gateway"].asString(), "");
-    EXPECT_EQ(entry["dns"].asString(), "10.0.0.53");
-    EXPECT_EQ(entry["class"].asString(), "");
-
-    entry = Send(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V6","ifname":"eth0"})");
-    EXPECT_EQ(vornwireless::utils::CompactJson(entry),
+    const char get[] =
+        R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE","type":"GTYPE_V4","ifname":"eth0"})";
+    EXPECT_EQ(vornwireless::utils::CompactJson(Send(get)),
+              R"({"class":"","dns":"10.0.0.53","exist":true,"gateway":"",)"
+              R"("ifname":"eth0","priority":0,"slave":false})");
+    std::string missing = get;
+    missing.replace(missing.find("V4"), 2, "V6");
+    EXPECT_EQ(vornwireless::utils::CompactJson(Send(missing)),
               R"({"class":"unknown","dns":"","exist":false,"gateway":"","priority":-1,)"
               R"("slave":false})");
-}
-
-TEST_F(RouteModuleTest, SlavesGoLastAndCopiesTakeTheSourcePlace) {
-    for (const char* name : {"eth0", "eth1", "eth2"}) {
-        Add("GTYPE_V4", name, -1, R"(,"gateway":"10.0.0.1")");
-    }
-    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth0","slave":true})");
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "eth0"));
-    EXPECT_TRUE(module_.GetList(GTYPE_V4)[2].slave);
-    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth1","slave":false})");
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "eth0"));
-    const std::string files = Files();
-    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth7","slave":true})");
-    EXPECT_EQ(Files(), files);
-
-    Send(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth2",)"
-         R"("interface_destination":"bond0"})");
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "bond0", "eth2", "eth0"));
-    EXPECT_EQ(module_.GetList(GTYPE_V4)[1].gateway.ToString(), "10.0.0.1");
-    // The old destination entry goes first, so the copy lands where the source stands then.
-    Send(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V4","interface_source":"eth0",)"
-         R"("interface_destination":"bond0","interface_source_delete":true})");
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth2", "bond0"));
-    EXPECT_TRUE(module_.GetList(GTYPE_V4)[2].slave);
-    EXPECT_THAT(root_.ReadFile(kDatabase), ::testing::HasSubstr("[bond0]\n"));
 }
 
 TEST_F(RouteModuleTest, FilesAreWrittenByteForByte) {
@@ -141,7 +126,7 @@ TEST_F(RouteModuleTest, FilesAreWrittenByteForByte) {
     Add("GTYPE_V4", "wlan0", -1, R"(,"gateway":"10.1.0.1")");
     Add("GTYPE_V6", "eth0", 0, R"(,"gateway":"fe80::1","dns":"2001:db8::53")");
     Add("GTYPE_V6", "sit0", 1, R"(,"gateway":"::","dns":"")");
-    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"wlan0","slave":true})");
+    Slave("wlan0", true);
 
     EXPECT_EQ(root_.ReadFile(kV4File),
               "[0]\n\tclass=ethernet\n\tdns=10.0.0.53\n\tgateway=10.0.0.1\n\tifname=eth0\n"
@@ -166,27 +151,27 @@ TEST_F(RouteModuleTest, FilesAreWrittenByteForByte) {
     // A delete rewrites the list and the resolver file, not the database.
     Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth0"})");
     EXPECT_EQ(root_.ReadFile(kResolv4), "");
-    EXPECT_THAT(root_.ReadFile(kDatabase), ::testing::HasSubstr("\tgateway=10.0.0.1\n"));
+    EXPECT_THAT(root_.ReadFile(kDatabase), HasSubstr("\tgateway=10.0.0.1\n"));
 }
 
-TEST_F(RouteModuleTest, MoreThanTenEntriesReadBackInTextOrder) {
-    for (int i = 0; i < 11; ++i) {
-        Add("GTYPE_V4", "eth" + std::to_string(i), -1);
-    }
+TEST_F(RouteModuleTest, ListsReadBackInTextOrderFromRequestsOfTwoThreads) {
+    auto addMany = [this](const char* type, const std::string& prefix, int count) {
+        for (int i = 0; i < count; ++i) {
+            Add(type, prefix + std::to_string(i), -1, R"(,"dns":"2001:db8::53")");
+        }
+    };
+    std::thread other(addMany, "GTYPE_V6", "a", 20);
+    addMany("GTYPE_V6", "b", 20);
+    other.join();
+    addMany("GTYPE_V4", "eth", 11);
     RouteModule restarted;
     ASSERT_EQ(restarted.Initialize(), 0);
-    std::vector<std::string> names;
-    for (const GatewayInfo& entry : restarted.GetList(GTYPE_V4)) {
-        names.push_back(entry.ifname);
-    }
-    EXPECT_THAT(names, ElementsAre("eth0", "eth1", "eth10", "eth2", "eth3", "eth4", "eth5", "eth6",
-                                   "eth7", "eth8", "eth9"));
-    EXPECT_THAT(restarted.GetList(GTYPE_V6), IsEmpty());
+    EXPECT_THAT(module::Names(restarted, GTYPE_V4),
+                ElementsAre("eth0", "eth1", "eth10", "eth2", "eth3", "eth4", "eth5", "eth6", "eth7",
+                            "eth8", "eth9"));
+    EXPECT_EQ(restarted.GetList(GTYPE_V6).size(), 40u);
     // Start-up re-enables the static table.
-    const std::vector<std::string> calls = root_.Calls();
-    EXPECT_TRUE(std::any_of(calls.begin(), calls.end(), [](const std::string& call) {
-        return call.find("static") != std::string::npos;
-    }));
+    EXPECT_THAT(root_.Calls(), testing::Contains(HasSubstr("static")));
 
     root_.WriteFile(kV6File, "[0]\n\tifname=eth0;reboot\n\tgateway=::\n[1]\n\tifname=eth1\n");
     EXPECT_EQ(module_.ReadGatewayListFromFile(GTYPE_V6), 0);
@@ -196,19 +181,18 @@ TEST_F(RouteModuleTest, MoreThanTenEntriesReadBackInTextOrder) {
     EXPECT_TRUE(log_.Contains("Unknown type to read config"));
 }
 
-TEST_F(RouteModuleTest, IPv4RefreshInstallsTheFirstUsableEntry) {
+TEST_F(RouteModuleTest, RefreshInstallsTheFirstUsableEntry) {
     Add("GTYPE_V4", "eth3", -1, R"(,"gateway":"10.3.0.1")");
     Add("GTYPE_V4", "eth0", -1, R"(,"gateway":"10.0.0.1","class":"ethernet")");
     Add("GTYPE_V4", "wlan0", -1, R"(,"gateway":"10.2.0.1","class":"ethernet")");
     Add("GTYPE_V4", "eth1", -1, R"(,"gateway":"10.1.0.1","class":"ethernet")");
-    Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"eth3","slave":true})");
+    Slave("eth3", true);
     root_.Scenario("ip",
                    "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n"
                    "when route add default via 10.2.0.1 dev wlan0\nexit 2\n");
     root_.Scenario("ethtool", "when eth0\nprint \tLink detected: no\n");
     const std::string files = Files();
     root_.ClearCalls();
-
     Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V4"})");
     EXPECT_THAT(root_.Calls(),
                 ElementsAre("/sbin/ip -4 route show table main", "/sbin/ip route show table main",
@@ -224,48 +208,37 @@ TEST_F(RouteModuleTest, IPv4RefreshInstallsTheFirstUsableEntry) {
     root_.Scenario("ip",
                    "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n"
                    "when route add *\nexit 2\n");
-    root_.ClearCalls();
     Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth1","priority":-2,)"
          R"("refresh":true})");
-    const std::vector<std::string> calls = root_.Calls();
-    ASSERT_FALSE(calls.empty());
-    EXPECT_EQ(calls.back(), "/sbin/ip -4 route replace default via 10.9.0.1");
+    EXPECT_EQ(root_.Calls().back(), "/sbin/ip -4 route replace default via 10.9.0.1");
     EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth0", "wlan0", "eth3"));
 
-    RouteModule empty;
-    root_.ClearCalls();
-    EXPECT_EQ(empty.RefreshDefaultGatewayV4(), 0);
-    EXPECT_THAT(root_.Calls(), IsEmpty());
-}
-
-TEST_F(RouteModuleTest, IPv6RefreshReplacesEveryDefaultRoute) {
+    // IPv6 replaces every default route; "::" means a route through the device alone.
     Add("GTYPE_V6", "eth0", -1, R"(,"gateway":"fe80::1","class":"ethernet")");
     Add("GTYPE_V6", "sit0", -1, R"(,"gateway":"::")");
     Add("GTYPE_V6", "eth1", -1, R"(,"gateway":"fe80::2")");
     root_.Scenario("ip",
                    "when -6 route show table main\nprint default via fe80::9 dev eth9\n"
                    "print default via fe80::8 dev eth8\n");
-    root_.Scenario("ethtool", "when eth0\nprint \tLink detected: no\n");
     root_.ClearCalls();
-
     Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V6"})");
     EXPECT_THAT(root_.Calls(),
                 ElementsAre("/sbin/ip -6 route show table main", "/sbin/ip -6 route delete default",
                             "/sbin/ip -6 route delete default", "/usr/vorn/bin/ethtool eth0",
                             "/sbin/ip -6 route add default dev sit0"));
     EXPECT_THAT(Names(GTYPE_V6), ElementsAre("sit0", "eth0", "eth1"));
-
     root_.Scenario("ip", "when -6 route add default dev sit0\nexit 2\n");
     root_.ClearCalls();
     Send(R"({"method":"REFRESH_GATEWAY","type":"ALL"})");
     EXPECT_THAT(root_.Calls(),
-                ElementsAre("/sbin/ip -6 route show table main",
-                            "/sbin/ip -6 route add default dev sit0", "/usr/vorn/bin/ethtool eth0",
-                            "/sbin/ip -6 route add default via fe80::2 dev eth1"));
+                testing::Contains("/sbin/ip -6 route add default via fe80::2 dev eth1"));
     EXPECT_THAT(Names(GTYPE_V6), ElementsAre("eth1", "sit0", "eth0"));
 
-    Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V5"})");
-    EXPECT_TRUE(log_.Contains("Unknown type to add info"));
+    RouteModule empty;
+    root_.ClearCalls();
+    EXPECT_FALSE(IsEthernetLinkDetected("eth0;touch /tmp/x"));
+    EXPECT_EQ(empty.RefreshDefaultGatewayV4(), 0);
+    EXPECT_THAT(root_.Calls(), IsEmpty());
 }
 
 TEST_F(RouteModuleTest, BadRequestsChangeNothing) {
@@ -312,7 +285,6 @@ TEST_F(RouteModuleTest, BadRequestsChangeNothing) {
     EXPECT_TRUE(log_.Contains("Invalid request"));
 
     Json::Value answer;
-    EXPECT_EQ(module_.GetGatewayListData(Json::Value("GTYPE_V4"), answer), -1);
     EXPECT_EQ(module_.GetGatewayListData(Json::Value(Json::objectValue), answer), -1);
     EXPECT_TRUE(log_.Contains("Unknown type to get data"));
     EXPECT_EQ(module_.WriteGatewayListToFile(static_cast<GATEWAY_TYPE>(-1)), -1);
@@ -321,22 +293,5 @@ TEST_F(RouteModuleTest, BadRequestsChangeNothing) {
     EXPECT_EQ(Files(), files);
 }
 
-TEST_F(RouteModuleTest, RequestsFromTwoThreadsAreSerialised) {
-    auto addMany = [this](const std::string& prefix) {
-        for (int i = 0; i < 20; ++i) {
-            Add("GTYPE_V6", prefix + std::to_string(i), 0, R"(,"dns":"2001:db8::53")");
-        }
-    };
-    std::thread other(addMany, "a");
-    addMany("b");
-    other.join();
-    EXPECT_EQ(module_.GetList(GTYPE_V6).size(), 40u);
-    RouteModule reread;
-    EXPECT_EQ(reread.ReadGatewayListFromFile(GTYPE_V6), 0);
-    EXPECT_EQ(reread.GetList(GTYPE_V6).size(), 40u);
-}
-
 }  // namespace
-}  // namespace module
-}  // namespace network
-}  // namespace vornnetwork
+}  // namespace vornnetwork::network::module

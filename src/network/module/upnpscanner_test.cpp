@@ -6,9 +6,7 @@
 
 #include "support/log_capture.h"
 
-namespace vornnetwork {
-namespace network {
-namespace module {
+namespace vornnetwork::network::module {
 namespace {
 
 std::string Document(const std::string& device) {
@@ -67,6 +65,4 @@ TEST(UpnpScannerTest, AnswersWithoutAnHttpLocationAreSkippedWithoutADownload) {
 }
 
 }  // namespace
-}  // namespace module
-}  // namespace network
-}  // namespace vornnetwork
+}  // namespace vornnetwork::network::module

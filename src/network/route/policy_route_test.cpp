@@ -6,8 +6,7 @@
 
 #include "support/sim_root.h"
 
-namespace vornnetwork {
-namespace network {
+namespace vornnetwork::network {
 namespace {
 
 using ::testing::ElementsAre;
@@ -158,14 +157,14 @@ TEST_F(PolicyRouteTest, UntrustedValuesNeverReachACommandOrAFile) {
 
 TEST_F(PolicyRouteTest, SubnetFormatClearsHostBitsAndRefusesHoles) {
     std::string subnet;
-    ASSERT_EQ(GetSubnetFormat("192.168.1.77", "255.255.255.0", subnet), 0);
-    EXPECT_EQ(subnet, "192.168.1.0/24");
-    ASSERT_EQ(GetSubnetFormat("10.200.3.4", "255.192.0.0", subnet), 0);
-    EXPECT_EQ(subnet, "10.192.0.0/10");
-    ASSERT_EQ(GetSubnetFormat("10.0.0.9", "0.0.0.0", subnet), 0);
-    EXPECT_EQ(subnet, "0.0.0.0/0");
-    ASSERT_EQ(GetSubnetFormat("10.0.0.9", "255.255.255.255", subnet), 0);
-    EXPECT_EQ(subnet, "10.0.0.9/32");
+    const char* const cases[][3] = {{"192.168.1.77", "255.255.255.0", "192.168.1.0/24"},
+                                    {"10.200.3.4", "255.192.0.0", "10.192.0.0/10"},
+                                    {"10.0.0.9", "0.0.0.0", "0.0.0.0/0"},
+                                    {"10.0.0.9", "255.255.255.255", "10.0.0.9/32"}};
+    for (const auto& c : cases) {
+        ASSERT_EQ(GetSubnetFormat(c[0], c[1], subnet), 0) << c[0];
+        EXPECT_EQ(subnet, c[2]);
+    }
     EXPECT_EQ(GetSubnetFormat("10.0.0.9", "255.0.255.0", subnet), -1);
     EXPECT_EQ(GetSubnetFormat("10.0.0.9", "24", subnet), -1);
     EXPECT_EQ(GetSubnetFormat("10.0.0", "255.0.0.0", subnet), -1);
@@ -173,5 +172,4 @@ TEST_F(PolicyRouteTest, SubnetFormatClearsHostBitsAndRefusesHoles) {
 }
 
 }  // namespace
-}  // namespace network
-}  // namespace vornnetwork
+}  // namespace vornnetwork::network
