@@ -4,11 +4,14 @@
 #include <sys/types.h>
 
 #include <chrono>
+#include <memory>
 #include <string>
 #include <vector>
 
 namespace vorn {
 namespace test {
+
+class DaemonProcess;
 
 // A private session bus (a dbus-daemon of our own). While the object lives,
 // DBUS_SESSION_BUS_ADDRESS points at it, for this process and every program it starts; the
@@ -26,10 +29,10 @@ class PrivateBus {
     // False (and the test failed) when the daemon could not be started.
     bool Started() const { return !address_.empty(); }
     const std::string& Address() const { return address_; }
-    pid_t Pid() const { return pid_; }
+    pid_t Pid() const;
 
   private:
-    pid_t pid_ = -1;
+    std::unique_ptr<DaemonProcess> daemon_;
     std::string address_;
     std::string savedAddress_;
     bool hadAddress_ = false;

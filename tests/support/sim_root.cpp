@@ -1,21 +1,15 @@
 #include "support/sim_root.h"
 
-#include <spawn.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <vector>
 
 #include "platform/root_path.h"
-
-extern char** environ;
+#include "support/private_bus.h"
+#include "support/waiting.h"
 
 namespace vorn {
 namespace test {
@@ -32,40 +26,14 @@ const char kScenarioDir[] = "/.vornsim/scenario/";
     std::abort();
 }
 
-std::string MakeTempDir() {
-    const char* tmp = std::getenv("TMPDIR");
-    std::string pattern =
-        std::string(tmp != nullptr && *tmp != '\0' ? tmp : "/tmp") + "/vorn-root-XXXXXX";
-    if (mkdtemp(&pattern[0]) == nullptr) {
-        Die("mkdtemp " + pattern + ": " + std::strerror(errno));
-    }
-    return pattern;
-}
-
 void RunMakeRoot(SimRoot::Kind kind, const std::string& dir) {
-    std::string program = VORN_SOURCE_DIR "/sim/make-root";
-    std::string live = "--live";
-    std::vector<char*> argv{&program[0]};
+    std::vector<std::string> argv{VORN_SOURCE_DIR "/sim/make-root", dir};
     if (kind == SimRoot::Kind::kLive) {
-        argv.push_back(&live[0]);
+        argv.insert(argv.begin() + 1, "--live");
     }
-    std::string target = dir;
-    argv.push_back(&target[0]);
-    argv.push_back(nullptr);
-
-    pid_t pid = 0;
-    const int error = posix_spawn(&pid, program.c_str(), nullptr, nullptr, argv.data(), environ);
-    if (error != 0) {
-        Die("cannot run " + program + ": " + std::strerror(error));
-    }
-    int status = 0;
-    while (waitpid(pid, &status, 0) < 0) {
-        if (errno != EINTR) {
-            Die("waitpid for " + program + ": " + std::strerror(errno));
-        }
-    }
-    if (!WIFEXITED(status) || WEXITSTATUS(status) != 0) {
-        Die(program + " " + dir + " failed (status " + std::to_string(status) + ")");
+    std::string err;
+    if (dir.empty() || RunProgram(argv, std::chrono::seconds(60), nullptr, &err) != 0) {
+        Die("sim/make-root " + dir + " failed: " + err);
     }
 }
 
@@ -85,7 +53,7 @@ void RestoreVariable(const char* name, const std::string& value, bool had) {
 
 }  // namespace
 
-SimRoot::SimRoot(Kind kind) : dir_(MakeTempDir()) {
+SimRoot::SimRoot(Kind kind) : dir_(MakeTempDir("vorn-root")) {
     RunMakeRoot(kind, dir_);
     SaveVariable("VORN_ROOT", savedRoot_, hadRoot_);
     SaveVariable("PATH", savedPath_, hadPath_);

@@ -1,7 +1,9 @@
 #include "support/waiting.h"
 
 #include <gtest/gtest.h>
+#include <stdlib.h>
 
+#include <filesystem>
 #include <thread>
 #include <vector>
 
@@ -29,6 +31,12 @@ std::string Shell(const std::string& command) {
         text += line + "\n";
     }
     return text;
+}
+
+std::string MakeTempDir(const std::string& prefix) {
+    std::error_code error;
+    std::string pattern = (std::filesystem::temp_directory_path(error) / (prefix + "-XXXXXX"));
+    return !error && mkdtemp(&pattern[0]) != nullptr ? pattern : "";
 }
 
 }  // namespace test

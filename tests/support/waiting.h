@@ -16,6 +16,9 @@ bool WaitFor(const std::function<bool()>& done,
 // under the root as the library's own command lines are.
 std::string Shell(const std::string& command);
 
+// A new folder under TMPDIR (or /tmp) named prefix and a random tail; "" when none can be made.
+std::string MakeTempDir(const std::string& prefix);
+
 }  // namespace test
 }  // namespace vorn
 

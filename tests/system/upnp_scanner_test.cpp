@@ -3,26 +3,13 @@
 #include "network/module/upnpscanner.h"
 
 #include <arpa/inet.h>
-#include <netinet/in.h>
-#include <sys/mount.h>
-#include <sys/socket.h>
+#include <gmock/gmock.h>
 #include <unistd.h>
 
-#include <gmock/gmock.h>
-
-#include <chrono>
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <functional>
-#include <memory>
-#include <string>
-#include <thread>
-#include <vector>
 
-#include "support/log_capture.h"
-#include "support/net_namespace.h"
-#include "support/private_bus.h"
+#include "support/peer_namespace.h"
 #include "support/waiting.h"
 
 namespace vornnetwork {
@@ -30,18 +17,13 @@ namespace network {
 namespace module {
 namespace {
 
-using vorn::test::WaitFor;
-
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
-using vorn::test::DaemonProcess;
-using vorn::test::RunProgram;
+using vorn::test::WaitFor;
 
 constexpr char kServerAddress[] = "10.77.0.2";
 constexpr char kFriendlyName[] = "Vorn Test Media";
 constexpr char kModelName[] = "Vorn DLNA 7";
-
-// A search collects answers for 13 seconds; a little more covers start-up and teardown.
 
 bool AcceptsConnections(const char* address, std::uint16_t port) {
     const int fd = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
@@ -64,87 +46,49 @@ Json::Value ServerEntry(const Json::Value& list) {
     return Json::Value();
 }
 
-class UpnpScannerSystemTest : public ::testing::Test {
+class UpnpScannerSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
     void SetUp() override {
-        VORN_ENTER_PRIVATE_NETWORK_NAMESPACE_OR_SKIP();
+        PeerNamespaceTest::SetUp();
+        if (IsSkipped() || HasFatalFailure()) {
+            return;
+        }
         if (!std::filesystem::exists("/usr/sbin/minidlnad")) {
             GTEST_SKIP() << "minidlna is not installed";
         }
-        // "ip netns" keeps its namespaces under /run: a private one leaves nothing on the host.
-        ASSERT_EQ(mount("tmpfs", "/run", "tmpfs", 0, nullptr), 0);
-        mounted_ = true;
-        char dir[] = "/tmp/upnp-scanner-XXXXXX";
-        ASSERT_NE(mkdtemp(dir), nullptr);
-        dir_ = dir;
-        Ip({"netns", "add", "dlna"});
-        Ip({"link", "add", "u0", "index", "11", "type", "veth", "peer", "name", "d0", "netns",
-            "dlna", "index", "21"});
-        Ip({"addr", "add", "10.77.0.1/24", "dev", "u0"});
-        // libupnp binds to the link-local address too, which must not be tentative then.
-        std::ofstream("/proc/sys/net/ipv6/conf/u0/accept_dad") << "0\n";
-        Ip({"link", "set", "u0", "up"});
+        AddPeer("dlna", "u0", 11, "d0", 21);
+        Ip("addr add 10.77.0.1/24 dev u0");
+        Ip(std::string("-n dlna addr add ") + kServerAddress + "/24 dev d0");
         // Without a multicast route the search goes nowhere, and says nothing.
-        Ip({"route", "add", "224.0.0.0/4", "dev", "u0"});
-        Ip({"-n", "dlna", "addr", "add", std::string(kServerAddress) + "/24", "dev", "d0"});
-        Ip({"-n", "dlna", "link", "set", "lo", "up"});
-        Ip({"-n", "dlna", "link", "set", "d0", "up"});
-        Ip({"-n", "dlna", "route", "add", "224.0.0.0/4", "dev", "d0"});
-        StartMediaServer();
-    }
+        Ip("route add 224.0.0.0/4 dev u0");
+        Ip("-n dlna route add 224.0.0.0/4 dev d0");
 
-    void TearDown() override {
-        server_.reset();
-        if (!dir_.empty()) {
-            std::filesystem::remove_all(dir_);
-        }
-        if (mounted_) {
-            RunProgram({"/sbin/ip", "netns", "del", "dlna"}, std::chrono::seconds(10));
-            EXPECT_EQ(umount2("/run", MNT_DETACH), 0);
-        }
-    }
-
-    void Ip(const std::vector<std::string>& arguments) {
-        std::vector<std::string> argv{"/sbin/ip"};
-        argv.insert(argv.end(), arguments.begin(), arguments.end());
-        std::string err;
-        ASSERT_EQ(RunProgram(argv, std::chrono::seconds(10), nullptr, &err), 0) << err;
-    }
-
-    void StartMediaServer() {
-        std::filesystem::create_directories(dir_ + "/media");
-        const std::string conf = dir_ + "/minidlna.conf";
-        std::ofstream(conf) << "media_dir=" << dir_ << "/media\n"
-                            << "db_dir=" << dir_ << "\nlog_dir=" << dir_ << "\n"
-                            << "network_interface=d0\nport=8200\ninotify=no\n"
-                            << "friendly_name=" << kFriendlyName << "\n"
-                            << "model_name=" << kModelName << "\n";
-        server_ = std::make_unique<DaemonProcess>(
-            std::vector<std::string>{"/sbin/ip", "netns", "exec", "dlna", "/usr/sbin/minidlnad",
-                                     "-d", "-f", conf, "-P", dir_ + "/minidlna.pid"});
-        ASSERT_TRUE(server_->Started());
+        const std::string dir = root_->Dir() + "/dlna";
+        std::filesystem::create_directories(dir + "/media");
+        std::ofstream(dir + "/minidlna.conf")
+            << "media_dir=" << dir << "/media\ndb_dir=" << dir << "\nlog_dir=" << dir
+            << "\nnetwork_interface=d0\nport=8200\ninotify=no\nfriendly_name=" << kFriendlyName
+            << "\nmodel_name=" << kModelName << "\n";
+        vorn::test::DaemonProcess& server =
+            Start({"/usr/sbin/minidlnad", "-d", "-f", dir + "/minidlna.conf", "-P",
+                   dir + "/minidlna.pid"},
+                  "dlna");
         ASSERT_TRUE(WaitFor([] { return AcceptsConnections(kServerAddress, 8200); },
                             std::chrono::seconds(10)))
-            << server_->Stdout() << server_->Stderr();
+            << server.Stdout() << server.Stderr();
     }
 
-    // Waits until the running search has found the server, then until it has ended.
+    // Waits until the running search has found the server, then until it has ended; a search
+    // collects answers for 13 seconds.
     Json::Value SearchResult(UpnpScanner& scanner) {
         Json::Value found;
-        EXPECT_TRUE(WaitFor(
-            [&] {
-                found = ServerEntry(scanner.GetClientList());
-                return !found.isNull();
-            },
-            std::chrono::seconds(20)));
-        EXPECT_TRUE(WaitFor([] { return !UpnpScanner::IsSearching(); }, std::chrono::seconds(20)));
+        EXPECT_TRUE(WaitFor([&] {
+            found = ServerEntry(scanner.GetClientList());
+            return !found.isNull();
+        }));
+        EXPECT_TRUE(WaitFor([] { return !UpnpScanner::IsSearching(); }));
         return found;
     }
-
-    vorn::test::LogCapture log_;
-    std::string dir_;
-    bool mounted_ = false;
-    std::unique_ptr<DaemonProcess> server_;
 };
 
 TEST_F(UpnpScannerSystemTest, SearchFindsTheMediaServerWithItsDescriptionsNames) {
