@@ -10,6 +10,7 @@
 #include "network/module/module_manager.h"
 #include "support/private_bus.h"
 #include "utils/dbus_client.h"
+#include "utils/json_text.h"
 
 namespace {
 
@@ -46,12 +47,10 @@ class RecordingRouteModule : public BaseModule {
 };
 RecordingRouteModule* RecordingRouteModule::instance = nullptr;
 
-Json::Value Object(std::initializer_list<std::pair<const char*, Json::Value>> pairs) {
-    Json::Value object(Json::objectValue);
-    for (const auto& pair : pairs) {
-        object[pair.first] = pair.second;
-    }
-    return object;
+Json::Value Parse(const std::string& text) {
+    Json::Value value;
+    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
+    return value;
 }
 
 TEST(GatewayAnnouncementTest, TheRouteModuleGetsExactlyTheAnnouncedKeys) {
@@ -73,22 +72,15 @@ TEST(GatewayAnnouncementTest, TheRouteModuleGetsExactlyTheAnnouncedKeys) {
         EXPECT_TRUE(RefreshGateway("GTYPE_V6"));
 
         RecordingRouteModule& module = *RecordingRouteModule::instance;
-        EXPECT_EQ(module.Request(0), Object({{"method", "ADD_GATEWAY_DATA"},
-                                             {"type", "GTYPE_V4"},
-                                             {"priority", 0},
-                                             {"ifname", "eth0"},
-                                             {"gateway", "10.0.0.1"},
-                                             {"dns", "10.0.0.53"},
-                                             {"class", "ethernet"},
-                                             {"refresh", true}}));
-        EXPECT_EQ(module.Request(1), Object({{"method", "DEL_GATEWAY_DATA"},
-                                             {"type", "GTYPE_V6"},
-                                             {"ifname", "wlan0"},
-                                             {"refresh", false}}));
-        EXPECT_EQ(module.Request(2), Object({{"method", "GET_GATEWAY_DATA_BY_INTERFACE"},
-                                             {"type", "GTYPE_V4"},
-                                             {"ifname", "eth0"}}));
-        EXPECT_EQ(module.Request(4), Object({{"method", "REFRESH_GATEWAY"}, {"type", "GTYPE_V6"}}));
+        EXPECT_EQ(
+            module.Request(0),
+            Parse(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","priority":0,"ifname":"eth0",)"
+                  R"("gateway":"10.0.0.1","dns":"10.0.0.53","class":"ethernet","refresh":true})"));
+        EXPECT_EQ(module.Request(1), Parse(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V6",)"
+                                           R"("ifname":"wlan0","refresh":false})"));
+        EXPECT_EQ(module.Request(2), Parse(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE",)"
+                                           R"("type":"GTYPE_V4","ifname":"eth0"})"));
+        EXPECT_EQ(module.Request(4), Parse(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V6"})"));
 
         server.QuitLoop();
         loop.join();
