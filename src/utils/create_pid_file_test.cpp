@@ -7,8 +7,7 @@
 
 #include "support/sim_root.h"
 
-namespace vornwireless {
-namespace utils {
+namespace vornwireless::utils {
 namespace {
 
 using CreatePidFileTest = vorn::test::RootTest;
@@ -39,5 +38,4 @@ TEST_F(CreatePidFileTest, HoldsTheLockAgainstOtherProcesses) {
 }
 
 }  // namespace
-}  // namespace utils
-}  // namespace vornwireless
+}  // namespace vornwireless::utils

@@ -8,8 +8,7 @@
 
 #include "support/sim_root.h"
 
-namespace vornwireless {
-namespace utils {
+namespace vornwireless::utils {
 namespace {
 
 using NetLinkFlagTest = vorn::test::RootTest;
@@ -44,5 +43,4 @@ TEST_F(NetLinkFlagTest, FlagHoldsOnlyWhileItsProcessLives) {
 }
 
 }  // namespace
-}  // namespace utils
-}  // namespace vornwireless
+}  // namespace vornwireless::utils

@@ -4,30 +4,30 @@
 
 #include "support/sim_root.h"
 
-namespace vornwireless {
-namespace utils {
+namespace vornwireless::utils {
 namespace {
 
 using ResetFilesTest = vorn::test::RootTest;
 
-const char* const kFactory = "/usr/vorn/etc.defaults/wifi/wifi_topology_router";
-const char* const kWorking = "/usr/vorn/etc/wifi/wifi_topology_router";
+const std::string kFactory = "/usr/vorn/etc.defaults/wifi/wifi_topology_";
+const std::string kWorking = "/usr/vorn/etc/wifi/wifi_topology_";
 
-TEST_F(ResetFilesTest, PutsTheFactoryCopyBackOverTheWorkingOne) {
-    root_.WriteFile(kFactory, "factory\n");
-    root_.WriteFile(kWorking, "changed\n");
-    ResetFiles(kFactory, kWorking);
-    EXPECT_EQ(root_.ReadFile(kWorking), "factory\n");
-
+TEST_F(ResetFilesTest, PutsFactoryCopiesBackOrRemovesTheWorkingOnes) {
+    root_.WriteFile(kFactory + "router", "factory\n");
+    root_.WriteFile(kWorking + "router", "changed\n");
+    ResetFiles((kFactory + "router").c_str(), (kWorking + "router").c_str());
+    EXPECT_EQ(root_.ReadFile(kWorking + "router"), "factory\n");
+    root_.WriteFile(kFactory + "bridge", "b\n");
+    ResetFiles((kFactory + "*").c_str(), (kWorking + "*").c_str());
+    EXPECT_EQ(root_.ReadFile(kWorking + "bridge"), "b\n");
     // Without a factory copy the working file is only removed.
-    ResetFiles("/usr/vorn/etc.defaults/wifi/none", kWorking);
-    EXPECT_FALSE(root_.Exists(kWorking));
-    EXPECT_TRUE(log_.Matching(" Failed").empty());
-
-    ResetFiles(kFactory, "/no/such/dir/wifi_topology_router");
+    ResetFiles((kFactory + "none").c_str(), (kWorking + "router").c_str());
+    EXPECT_FALSE(root_.Exists(kWorking + "router"));
+    EXPECT_TRUE(log_.Lines().empty());
+    ResetFiles((kFactory + "router").c_str(), "/no/such/dir/wifi_topology_router");
     EXPECT_TRUE(log_.Contains("reset_files.cpp:"));
-    EXPECT_TRUE(log_.Contains(" Failed to copy [" + std::string(kFactory) +
-                              "] to [/no/such/dir/wifi_topology_router]"));
+    EXPECT_TRUE(log_.Contains(" Failed to copy [" + kFactory +
+                              "router] to [/no/such/dir/wifi_topology_router]"));
 }
 
 TEST_F(ResetFilesTest, RemovesTreesAndFilesAndWritesSwitches) {
@@ -36,19 +36,15 @@ TEST_F(ResetFilesTest, RemovesTreesAndFilesAndWritesSwitches) {
     EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/ap"));
     RemoveFiles("/usr/vorn/etc/wifi/ap");
     // Patterns name every match, though no shell runs rm.
-    root_.WriteFile("/usr/vorn/etc/wifi/wifi_ap_001122334455", "x");
-    root_.WriteFile("/usr/vorn/etc/wifi/wifi_ap_00aabbccddee", "x");
-    root_.WriteFile("/usr/vorn/etc/wifi/wifi_client_001122334455", "x");
+    for (const char* name : {"wifi_ap_001122334455", "wifi_ap_00aabbccddee", "wifi_client_0011"}) {
+        root_.WriteFile("/usr/vorn/etc/wifi/" + std::string(name), "x");
+    }
     RemoveFiles("/usr/vorn/etc/wifi/wifi_ap_*");
     EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/wifi_ap_001122334455"));
     EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/wifi_ap_00aabbccddee"));
-    EXPECT_TRUE(root_.Exists("/usr/vorn/etc/wifi/wifi_client_001122334455"));
-    root_.WriteFile("/usr/vorn/etc.defaults/wifi/wifi_topology_bridge", "b\n");
-    ResetFiles("/usr/vorn/etc.defaults/wifi/wifi_topology_*", "/usr/vorn/etc/wifi/wifi_topology_*");
-    EXPECT_EQ(root_.ReadFile("/usr/vorn/etc/wifi/wifi_topology_bridge"), "b\n");
-    root_.WriteFile("/tmp/one", "x");
-    RemoveFile("/tmp/one");
-    EXPECT_FALSE(root_.Exists("/tmp/one"));
+    EXPECT_TRUE(root_.Exists("/usr/vorn/etc/wifi/wifi_client_0011"));
+    RemoveFile("/usr/vorn/etc/wifi/wifi_client_0011");
+    EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/wifi_client_0011"));
     EXPECT_TRUE(log_.Lines().empty());
 
     root_.WriteFile("/proc/sys/net/ipv6/conf/all/forwarding", "0\n");
@@ -59,5 +55,4 @@ TEST_F(ResetFilesTest, RemovesTreesAndFilesAndWritesSwitches) {
 }
 
 }  // namespace
-}  // namespace utils
-}  // namespace vornwireless
+}  // namespace vornwireless::utils

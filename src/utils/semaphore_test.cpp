@@ -8,53 +8,36 @@
 
 #include <random>
 
-namespace vornwireless {
-namespace semaphore {
+namespace vornwireless::semaphore {
 namespace {
 
-class SemaphoreTest : public ::testing::Test {
-  protected:
-    void TearDown() override {
-        const int id = semget(static_cast<key_t>(key_), 1, 0);
-        if (id >= 0) {
-            semctl(id, 0, IPC_RMID);
-        }
-    }
-
-    int Value() const { return semctl(semget(static_cast<key_t>(key_), 1, 0), 0, GETVAL); }
-
+TEST(SemaphoreTest, GetKeepsTheValueOfAnExistingSetAndADeadHolderReleasesIt) {
     // Never IPC_PRIVATE (0), and unlikely to meet a set of anyone else.
-    const uint32_t key_ = std::random_device()() | 0x40000000u;
-};
-
-TEST_F(SemaphoreTest, GetKeepsTheValueOfAnExistingSet) {
-    const Semaphore semaphore(key_);
+    const uint32_t key = std::random_device()() | 0x40000000u;
+    const auto value = [key] { return semctl(semget(static_cast<key_t>(key), 1, 0), 0, GETVAL); };
+    const Semaphore semaphore(key);
     EXPECT_EQ(semaphore.Get(nullptr), -1);
     int id = -1;
     ASSERT_EQ(semaphore.Get(&id), 0);
-    EXPECT_EQ(Value(), 1);
-
+    EXPECT_EQ(value(), 1);
     ASSERT_EQ(semaphore.Enter(), 0);
     int again = -1;
-    ASSERT_EQ(Semaphore(key_).Get(&again), 0);
+    ASSERT_EQ(Semaphore(key).Get(&again), 0);
     EXPECT_EQ(again, id);
-    EXPECT_EQ(Value(), 0);
+    EXPECT_EQ(value(), 0);
     EXPECT_EQ(semaphore.Release(), 0);
-    EXPECT_EQ(Value(), 1);
-}
+    EXPECT_EQ(value(), 1);
 
-TEST_F(SemaphoreTest, AHolderThatDiesReleasesIt) {
-    const Semaphore semaphore(key_);
     const pid_t child = fork();
     if (child == 0) {
         _exit(semaphore.Enter() == 0 ? 0 : 1);
     }
     int status = 0;
     ASSERT_EQ(waitpid(child, &status, 0), child);
-    ASSERT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
-    EXPECT_EQ(Value(), 1);
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+    EXPECT_EQ(value(), 1);
+    semctl(id, 0, IPC_RMID);
 }
 
 }  // namespace
-}  // namespace semaphore
-}  // namespace vornwireless
+}  // namespace vornwireless::semaphore
