@@ -17,19 +17,15 @@ class Block {
         rtattr header{};
         header.rta_type = type;
         header.rta_len = static_cast<std::uint16_t>(length >= 0 ? length : RTA_LENGTH(payload));
-        bytes_.resize(bytes_.size() + RTA_SPACE(payload), 0xAB);
-        std::memcpy(&bytes_[bytes_.size() - RTA_SPACE(payload)], &header, sizeof(header));
+        const std::size_t at = words_.size();
+        words_.resize(at + RTA_SPACE(payload) / 4, 0xABABABABu);
+        std::memcpy(&words_[at], &header, sizeof(header));
         return *this;
     }
-    const rtattr* First() {
-        words_.assign((bytes_.size() + 3) / 4, 0);
-        std::memcpy(words_.data(), bytes_.data(), bytes_.size());
-        return reinterpret_cast<const rtattr*>(words_.data());
-    }
-    int Size() const { return static_cast<int>(bytes_.size()); }
+    const rtattr* First() const { return reinterpret_cast<const rtattr*>(words_.data()); }
+    int Size() const { return static_cast<int>(words_.size() * 4); }
 
   private:
-    std::vector<unsigned char> bytes_;
     std::vector<std::uint32_t> words_;
 };
 
