@@ -92,14 +92,41 @@ TEST_F(PolicyRouteTest, DisableKeepsTheIdAndEnableAgainReusesIt) {
     ASSERT_EQ(route.AddRule(Rule(IP_TYPE_V4, "eth0", "lan", "10.1.0.0", "255.255.0.0", "10.0.0.1")),
               0);
     ASSERT_EQ(route.EnableTable(IP_TYPE_V4, "eth0", "10.0.0.2"), 0);
+    // Enabling again lists each source once.
+    ASSERT_EQ(route.EnableTable(IP_TYPE_V4, "eth0", "10.0.0.5,10.0.0.2"), 0);
+    ASSERT_EQ(route.EnableTable(IP_TYPE_V4, "eth0", "10.0.0.5"), 0);
+    EXPECT_EQ(root_.ReadFile(kMulti),
+              "[eth0-table]\n\tenable=yes\n\tid=3\n\tsource=10.0.0.2,10.0.0.5\n");
     root_.ClearCalls();
 
     ASSERT_EQ(route.DisableTable(IP_TYPE_V4, "eth0"), 0);
     EXPECT_THAT(root_.Calls(),
                 ElementsAre("/sbin/ip -4 route flush table eth0-table",
-                            "/sbin/ip -4 rule delete from 10.0.0.2 lookup eth0-table"));
+                            "/sbin/ip -4 rule delete from 10.0.0.2 lookup eth0-table",
+                            "/sbin/ip -4 rule delete from 10.0.0.5 lookup eth0-table"));
     EXPECT_EQ(root_.ReadFile(kMulti), "[eth0-table]\n\tenable=no\n\tid=3\n\tsource=\n");
     EXPECT_EQ(root_.ReadFile(kRtTables), "");
+
+    // No table outgrows 64 sources; one that did by hand, with a bad source among them, still
+    // loses every lookup rule it can name.
+    std::string forty;
+    std::string other;
+    for (int i = 0; i < 40; ++i) {
+        forty += (i > 0 ? "," : "") + std::string("10.0.1.") + std::to_string(i);
+        other += (i > 0 ? "," : "") + std::string("10.0.2.") + std::to_string(i);
+    }
+    ASSERT_EQ(route.EnableTable(IP_TYPE_V4, "eth0", forty), 0);
+    const std::string enabled = root_.ReadFile(kMulti);
+    EXPECT_EQ(route.EnableTable(IP_TYPE_V4, "eth0", other), -1);
+    EXPECT_TRUE(log_.Contains("Too many sources for [eth0-table]"));
+    EXPECT_EQ(root_.ReadFile(kMulti), enabled);
+    root_.WriteFile(kMulti, "[eth0-table]\n\tenable=yes\n\tid=3\n\tsource=" + forty + "," +
+                                other + ",x;reboot\n");
+    root_.ClearCalls();
+    EXPECT_EQ(route.DisableTable(IP_TYPE_V4, "eth0"), 0);
+    EXPECT_EQ(root_.Calls().size(), 81u);
+    EXPECT_EQ(root_.Calls().back(), "/sbin/ip -4 rule delete from 10.0.2.39 lookup eth0-table");
+    EXPECT_EQ(root_.ReadFile(kMulti), "[eth0-table]\n\tenable=no\n\tid=3\n\tsource=\n");
 
     ASSERT_EQ(PolicyRoute().EnableTable(IP_TYPE_V4, "eth0", "10.0.0.3"), 0);
     EXPECT_EQ(root_.ReadFile(kRtTables), "3 eth0-table\n");
