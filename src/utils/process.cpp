@@ -38,10 +38,11 @@ bool RunsProgram(const std::string& pid, const std::string& name) {
         return false;
     }
     const std::string comm = stat.substr(open + 1, close - open - 1);
-    if (name.size() <= kCommLength) {
+    if (comm.size() < kCommLength) {
         return comm == name;
     }
-    return comm == name.substr(0, kCommLength) && ProgramName(pid) == name;
+    // A comm of full length may be a longer name cut short.
+    return name.compare(0, kCommLength, comm) == 0 && ProgramName(pid) == name;
 }
 
 bool IsPid(const char* text) {

@@ -6,8 +6,9 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <string>
-#include <vector>
+#include <thread>
 
 #include "support/sim_root.h"
 
@@ -17,25 +18,42 @@ namespace {
 
 using ProcessTest = vorn::test::RootTest;
 
-TEST_F(ProcessTest, FindsARunningProcessByName) {
-    // A process whose command line no other test run shares.
-    const std::string seconds = "1000." + std::to_string(getpid());
-    char* const argv[] = {const_cast<char*>("sleep"), const_cast<char*>(seconds.c_str()), nullptr};
-    pid_t sleeper = -1;
-    ASSERT_EQ(posix_spawnp(&sleeper, "sleep", nullptr, nullptr, argv, environ), 0);
-    const bool found = IsProcessAlive("sleep " + seconds);
-    kill(sleeper, SIGTERM);
-    waitpid(sleeper, nullptr, 0);
-    EXPECT_TRUE(found);
-    EXPECT_FALSE(IsProcessAlive("sleep " + seconds));
+// Runs sleep under another program name (a link in the test's root).
+pid_t SpawnAs(const vorn::test::SimRoot& root, const std::string& name) {
+    const std::string path = root.Path("/tmp/" + name);
+    EXPECT_EQ(symlink("/bin/sleep", path.c_str()), 0);
+    char* const argv[] = {const_cast<char*>(path.c_str()), const_cast<char*>("100"), nullptr};
+    pid_t pid = -1;
+    EXPECT_EQ(posix_spawn(&pid, path.c_str(), nullptr, nullptr, argv, environ), 0);
+    return pid;
 }
 
-TEST_F(ProcessTest, RefusesNamesThatCannotBeSingleQuoted) {
-    const std::vector<std::string> names = {"", "a'b", "a\\b", "a\nb", std::string(1100, 'x')};
-    for (const auto& name : names) {
-        EXPECT_FALSE(IsProcessAlive(name));
+TEST_F(ProcessTest, FindsALiveProgramByItsExactNameOnly) {
+    const std::string shortName = "vp" + std::to_string(getpid()) + "tool";
+    const std::string longName = "vornprocesstest-" + std::to_string(getpid()) + "-long";
+    const pid_t shortOne = SpawnAs(root_, shortName);
+    const pid_t longOne = SpawnAs(root_, longName);
+    EXPECT_TRUE(IsProcessAlive(shortName));
+    EXPECT_FALSE(IsProcessAlive(shortName.substr(0, shortName.size() - 4)));
+    EXPECT_TRUE(IsProcessAlive(longName));
+    // The kernel keeps 15 characters of a name: they alone do not make the longer name.
+    EXPECT_FALSE(IsProcessAlive(longName.substr(0, 15)));
+    EXPECT_FALSE(IsProcessAlive(longName + "x"));
+
+    // Killed but not yet reaped (a zombie) is not alive.
+    kill(shortOne, SIGKILL);
+    bool gone = false;
+    for (int i = 0; i < 200 && !gone; ++i) {
+        gone = !IsProcessAlive(shortName);
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
     }
-    EXPECT_EQ(log_.Matching(" Refused process name").size(), 5u);
+    EXPECT_TRUE(gone);
+    kill(longOne, SIGKILL);
+    waitpid(shortOne, nullptr, 0);
+    waitpid(longOne, nullptr, 0);
+    EXPECT_FALSE(IsProcessAlive(longName));
+    EXPECT_FALSE(IsProcessAlive(""));
+    EXPECT_FALSE(IsProcessAlive("/bin/" + shortName));
 }
 
 }  // namespace
