@@ -4,9 +4,12 @@
 #include <unistd.h>
 
 #include <chrono>
+#include <cstdio>
 #include <string>
 #include <thread>
+#include <vector>
 
+#include "platform/shell_command.h"
 #include "support/sim_root.h"
 
 namespace {
@@ -120,6 +123,28 @@ TEST_F(ArpScannerTest, HostileLinesAreSkippedBeforeAnyCommand) {
     EXPECT_EQ(scanner_->GetDHCPInfoByMAC("aa:bb:cc:00:00:31", name), -1);
     EXPECT_TRUE(log_.Contains("arpscanner.cpp:"));
     EXPECT_TRUE(log_.Contains("Failed to open dhcp leases file"));
+}
+
+TEST_F(ArpScannerTest, LargeTablesAreReadWholeAndACutIsLogged) {
+    SetTopology("router");
+    std::string table = "when -a\n";
+    char line[96];
+    for (int i = 0; i < 1100; ++i) {
+        std::snprintf(line, sizeof(line),
+                      "print h%d (10.1.%d.%d) at aa:bb:cc:00:%02x:%02x [ether] on br0\n", i,
+                      i / 256, i % 256, i / 256, i % 256);
+        table += line;
+    }
+    root_.Scenario("arp", table);
+    ASSERT_EQ(scanner_->GetArpTable(), 0);
+    EXPECT_EQ(scanner_->GetClientList()["ClientList"].size(), 1100u);
+    EXPECT_TRUE(log_.Matching("cut at").empty());
+
+    std::vector<std::string> lines;
+    ASSERT_EQ(vorn::platform::ReadShellCommandLines("/usr/bin/printf '%s\\n' a b c d", lines, 3),
+              0);
+    EXPECT_THAT(lines, ElementsAre("a", "b", "c"));
+    EXPECT_TRUE(log_.Contains("Output of [/usr/bin/printf '%s\\n' a b c d] cut at 3 lines"));
 }
 
 TEST_F(ArpScannerTest, GetDataAnswersTheLastFinishedScanWhileTheNextRuns) {
