@@ -65,6 +65,12 @@ TEST_F(QlibNetTest, LinkHandlersRunRcNetworkAndRefuseBadNames) {
     EXPECT_THAT(root_.Calls(), IsEmpty());
     root_.Scenario("rc.network", "when link-up *\nexit 1\n");
     EXPECT_EQ(QLIBNetIfLinkUpEvent("eth0"), -1);
+    // Every topology the wifi half writes has its code.
+    for (const auto& [word, code] : {std::make_pair("client", 1), std::make_pair("bridge", 2),
+                                     std::make_pair("router", 3), std::make_pair("repeater", 4)}) {
+        root_.WriteFile("/etc/vorninfo.conf", std::string("net_topology=\"") + word + "\"\n");
+        EXPECT_EQ(QLIBNetTopologyGet(0), code) << word;
+    }
     for (const auto& [settings, error] : {std::make_pair("net_topology=mesh\n", QLIBC_ERR_FORMAT),
                                           std::make_pair("", QLIBC_ERR_NOT_FOUND)}) {
         root_.WriteFile("/etc/vorninfo.conf", settings);

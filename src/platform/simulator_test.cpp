@@ -25,15 +25,21 @@ TEST_F(SimulatorTest, AnswersFromTheScenarioAndRecordsArgumentWordsUnambiguously
     EXPECT_EQ(FirstLine("/sbin/ip route show table 7 >/dev/null; echo $?"), "3\n");
     EXPECT_EQ(FirstLine("/sbin/ip -6 addr 2>&1 >/dev/null"), "RTNETLINK answers: No such device\n");
     EXPECT_EQ(FirstLine("/usr/vorn/sbin/brctl show; echo $?"), "0\n");
+    // Programs the wifi half runs are there too.
+    EXPECT_EQ(FirstLine("/usr/sbin/dhclient -x wlan0; /usr/vorn/sbin/vornnetdtool "
+                        "--refresh-gateway all; echo $?"),
+              "0\n");
     FirstLine("/etc/rc.network start-nat 'it'\\''s a' '' x=y");
     FirstLine("/sbin/iwconfig 'two\nlines'");
     const auto calls = root_.Calls();
     EXPECT_THAT(calls, ElementsAre("/sbin/ip route show table main", "/sbin/ip route show table 7",
                                    "/sbin/ip -6 addr", "/usr/vorn/sbin/brctl show",
+                                   "/usr/sbin/dhclient -x wlan0",
+                                   "/usr/vorn/sbin/vornnetdtool --refresh-gateway all",
                                    "/etc/rc.network start-nat 'it'\\''s a' '' x=y",
                                    "/sbin/iwconfig 'two'$'\\n''lines'"));
     // The shell reads the recorded words back as they were given.
-    EXPECT_EQ(FirstLine("printf '%s|' " + calls[4].substr(calls[4].find(' ') + 1) + "; echo"),
+    EXPECT_EQ(FirstLine("printf '%s|' " + calls[6].substr(calls[6].find(' ') + 1) + "; echo"),
               "start-nat|it's a||x=y|\n");
 }
 

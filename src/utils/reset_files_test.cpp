@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <fstream>
+
 #include "support/sim_root.h"
 
 namespace vornwireless::utils {
@@ -43,6 +45,12 @@ TEST_F(ResetFilesTest, RemovesTreesAndFilesAndWritesSwitches) {
     EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/wifi_ap_001122334455"));
     EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/wifi_ap_00aabbccddee"));
     EXPECT_TRUE(root_.Exists("/usr/vorn/etc/wifi/wifi_client_0011"));
+    // A path is never a shell line: ";", "$( )" and blanks are only characters of a name.
+    root_.WriteFile("/usr/vorn/etc/wifi/a b;touch x$(touch y)", "x");
+    RemoveFiles("/usr/vorn/etc/wifi/a b;touch x$(touch y)");
+    EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/a b;touch x$(touch y)"));
+    EXPECT_FALSE(root_.Exists("/x") || root_.Exists("/y"));
+    EXPECT_FALSE(std::ifstream("x").good() || std::ifstream("y").good());
     RemoveFile("/usr/vorn/etc/wifi/wifi_client_0011");
     EXPECT_FALSE(root_.Exists("/usr/vorn/etc/wifi/wifi_client_0011"));
     EXPECT_TRUE(log_.Lines().empty());
