@@ -1,14 +1,17 @@
 // vornnetdtool: calls the methods of the network daemon's service from the command line, and
-// manages the policy and static routes in-process (the service has no methods for them).
+// manages the policy and static routes and the IPv6 routers in-process (the service has no methods
+// for them).
 #include <dirent.h>
 
 #include <cstdio>
 #include <cstring>
 #include <functional>
+#include <memory>
 #include <string>
 #include <vector>
 
 #include "dbus/net_client.h"
+#include "ipv6/router/router6_factory.h"
 #include "network/route/policy_route.h"
 #include "network/route/static_route.h"
 #include "platform/root_path.h"
@@ -272,6 +275,50 @@ int ValidateStaticRoute(const std::vector<std::string>& words, Json::Value& data
     return StaticRoute().TestRuleVaild(rule, data);
 }
 
+using vorn::network::ipv6::router::Router6Attr;
+using vorn::network::ipv6::router::Router6Base;
+using vorn::network::ipv6::router::Router6Factory;
+
+// The stored settings with the LAN allocations beside them.
+int ShowRouter6(const std::vector<std::string>& words, Json::Value& data) {
+    Router6Attr attr(words[0], false);
+    if (attr.LoadConfig() != 0) {
+        return -1;
+    }
+    data = attr.ToJson();
+    data["lan"] = Json::Value(Json::objectValue);
+    for (const auto& lan : attr.lan) {
+        data["lan"][lan.first] = lan.second;
+    }
+    return 0;
+}
+
+// Stores validated settings; the type "off" stops and forgets the WAN's router instead.
+int SetRouter6(const std::vector<std::string>& words, Json::Value& data) {
+    Json::Value json;
+    if (!ParseObject(words[0], json) || !json["type"].isString() || !json["wan"].isString()) {
+        return kUsageError;
+    }
+    const std::string type = json["type"].asString();
+    if (type == "off") {
+        const std::unique_ptr<Router6Base> stored =
+            Router6Factory::newRouterV6Instance(json["wan"].asString());
+        return stored != nullptr && stored->Destroy() ? 0 : -1;
+    }
+    const std::unique_ptr<Router6Base> router = Router6Factory::newRouterV6Instance(type, json);
+    if (router == nullptr || router->Attr().SaveConfig() != 0) {
+        return -1;
+    }
+    data = router->Attr().ToJson();
+    return 0;
+}
+
+// Create or Destroy of the router stored for words[0].
+int RunRouter6(const std::vector<std::string>& words, bool (Router6Base::*step)() const) {
+    const std::unique_ptr<Router6Base> router = Router6Factory::newRouterV6Instance(words[0]);
+    return router != nullptr && ((*router).*step)() ? 0 : -1;
+}
+
 const std::vector<RouteCommand>& RouteCommands() {
     static const std::vector<RouteCommand> commands = {
         {"--list-policy-tables", "", "the enabled policy tables", 0, 0,
@@ -317,6 +364,20 @@ const std::vector<RouteCommand>& RouteCommands() {
              return w.size() == 1 ? routes.GetRouteTables(type, d)
                                   : routes.GetTableInfo(type, w[1], d);
          }},
+        {"--show-ipv6-router", "WAN", "the stored IPv6 router of WAN with its LAN prefixes", 1, 1,
+         ShowRouter6},
+        {"--set-ipv6-router", "JSON",
+         "check and store an IPv6 router (JSON below); type off stops and forgets it", 1, 1,
+         SetRouter6},
+        {"--start-ipv6-router", "WAN", "put the stored IPv6 router of WAN into effect", 1, 1,
+         [](const std::vector<std::string>& w, Json::Value&) {
+             return RunRouter6(w, &Router6Base::Create);
+         }},
+        {"--stop-ipv6-router", "WAN", "take the IPv6 router of WAN back and forget its settings", 1,
+         1,
+         [](const std::vector<std::string>& w, Json::Value&) {
+             return RunRouter6(w, &Router6Base::Destroy);
+         }},
     };
     return commands;
 }
@@ -348,7 +409,11 @@ void Usage(FILE* out) {
         "\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\"}\n"
         "  (IPv6: \"prefix_length\":\"64\" for \"mask\"; no \"ip\": the table's default route).\n"
         "A static route: {\"ip\":\"10.1.0.0\",\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\","
-        "\"ifname\":\"eth0\",\"enable\":true}.\n");
+        "\"ifname\":\"eth0\",\"enable\":true}.\n"
+        "An IPv6 router: {\"type\":\"native\",\"wan\":\"eth0\",\"is_default_gateway\":true};\n"
+        "  6in4 adds \"prefix\":\"2001:db8:1::/48\",\"remote_addr_v4\":\"198.51.100.1\",\n"
+        "  \"local_addr_v6\":\"2001:db8::2/64\"; 6to4 needs only the wan; wan \"pppoe\" is the\n"
+        "  current PPPoE interface.\n");
 }
 
 // Runs a route command when words name one; false when they do not.
