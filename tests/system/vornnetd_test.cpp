@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <signal.h>
 
+#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -338,6 +339,21 @@ TEST_F(VornnetdTest, ToolAnswersThroughItsExitStatusAndSigtermStopsTheDaemon) {
     EXPECT_THAT(err, HasSubstr("--get-device-list failed (-1)"));
     EXPECT_EQ(RunProgram({kTool, "--get-gateway-list", "v4"}, kCallTimeout, &out, &err), 0);
     EXPECT_EQ(out, "[]\n");
+
+    // A LAN of a thousand clients: the answer runs far past a request's bound.
+    std::string clients;
+    for (int i = 0; i < 1000; ++i) {
+        char line[80];
+        std::snprintf(line, sizeof(line), "1,240,nas-%d,10.0.%d.%d,aa:bb:cc:00:%02x:%02x\n", i,
+                      i / 256, i % 256, i / 256, i % 256);
+        clients += line;
+    }
+    root_.WriteFile("/tmp/linkyard_cvscanner_list.tmp", clients);
+    Json::Value data;
+    ASSERT_EQ(vornnetwork::dbus::NetClient().GetDeviceListData("cv", data), 0);
+    EXPECT_EQ(data["ClientList"].size(), 1000u);
+    EXPECT_EQ(RunProgram({kTool, "--get-device-list", "cv"}, kCallTimeout, &out, &err), 0) << err;
+    EXPECT_GT(out.size(), 200000u);
 
     EXPECT_EQ(RunProgram({kTool, "--ready"}, kCallTimeout, &out), 0);
     EXPECT_EQ(out, "ready\n");
