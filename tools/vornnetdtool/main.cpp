@@ -14,6 +14,7 @@
 #include "ipv6/router/router6_factory.h"
 #include "network/route/policy_route.h"
 #include "network/route/static_route.h"
+#include "platform/qlibc_file.h"
 #include "platform/root_path.h"
 #include "utils/config.h"
 #include "utils/json_text.h"
@@ -293,7 +294,18 @@ int ShowRouter6(const std::vector<std::string>& words, Json::Value& data) {
     return 0;
 }
 
-// Stores validated settings; the type "off" stops and forgets the WAN's router instead.
+// The WAN's stored router when its settings differ from attr's, so that it can be taken back.
+std::unique_ptr<Router6Base> ReplacedRouter6(const Router6Attr& attr) {
+    Router6Attr stored(attr.wan, attr.is_default_gateway);
+    if (QLIBCFileExist(stored.GetConfigName().c_str()) != 1 || stored.LoadConfig() != 0) {
+        return nullptr;
+    }
+    stored.is_default_gateway = attr.is_default_gateway;
+    return stored == attr ? nullptr : Router6Factory::newRouterV6InstanceImpl(stored);
+}
+
+// Checks the settings, takes back the WAN's router they replace and puts them into effect; the
+// type "off" only takes the stored router back.
 int SetRouter6(const std::vector<std::string>& words, Json::Value& data) {
     Json::Value json;
     if (!ParseObject(words[0], json) || !json["type"].isString() || !json["wan"].isString()) {
@@ -306,7 +318,11 @@ int SetRouter6(const std::vector<std::string>& words, Json::Value& data) {
         return stored != nullptr && stored->Destroy() ? 0 : -1;
     }
     const std::unique_ptr<Router6Base> router = Router6Factory::newRouterV6Instance(type, json);
-    if (router == nullptr || router->Attr().SaveConfig() != 0) {
+    if (router == nullptr) {
+        return -1;
+    }
+    const std::unique_ptr<Router6Base> replaced = ReplacedRouter6(router->Attr());
+    if ((replaced != nullptr && !replaced->Destroy()) || !router->Create()) {
         return -1;
     }
     data = router->Attr().ToJson();
@@ -367,8 +383,9 @@ const std::vector<RouteCommand>& RouteCommands() {
         {"--show-ipv6-router", "WAN", "the stored IPv6 router of WAN with its LAN prefixes", 1, 1,
          ShowRouter6},
         {"--set-ipv6-router", "JSON",
-         "check and store an IPv6 router (JSON below); type off stops and forgets it", 1, 1,
-         SetRouter6},
+         "check, store and start an IPv6 router (JSON below) in place of the WAN's own; type off "
+         "stops and forgets it",
+         1, 1, SetRouter6},
         {"--start-ipv6-router", "WAN", "put the stored IPv6 router of WAN into effect", 1, 1,
          [](const std::vector<std::string>& w, Json::Value&) {
              return RunRouter6(w, &Router6Base::Create);

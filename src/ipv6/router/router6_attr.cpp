@@ -29,8 +29,18 @@ constexpr int kNameSize = 1024;
 
 using HashPtr = std::unique_ptr<QLIBSZHASH, void (*)(QLIBSZHASH*)>;
 
-HashPtr NewHash() {
-    return HashPtr(QLIBCSzHashAlloc(kHashSize), QLIBCSzHashFree);
+// A hash for the settings of wan (converted: its interface); null (logged) for a name that
+// cannot name a file, or no memory.
+HashPtr SettingsHash(const std::string& wan, const std::string& converted) {
+    if (!IsValidInterfaceName(converted)) {
+        VORN_LOG(LOG_ERR, "Invalid wan interface [%s]", wan.c_str());
+        return HashPtr(nullptr, QLIBCSzHashFree);
+    }
+    HashPtr hash(QLIBCSzHashAlloc(kHashSize), QLIBCSzHashFree);
+    if (hash == nullptr) {
+        VORN_LOG(LOG_ERR, "Failed to allocate PQLIBSZHASH");
+    }
+    return hash;
 }
 
 std::string Value(const QLIBSZHASH* hash, const char* key) {
@@ -127,16 +137,8 @@ std::string Router6Attr::GetConfigName() const {
 
 int Router6Attr::SaveConfig() const {
     const std::string file = GetConfigName();
-    if (!IsValidInterfaceName(ConvertInterface(wan))) {
-        VORN_LOG(LOG_ERR, "Invalid wan interface [%s]", wan.c_str());
-        return -1;
-    }
-    HashPtr hash = NewHash();
-    if (hash == nullptr) {
-        VORN_LOG(LOG_ERR, "Failed to allocate PQLIBSZHASH");
-        return -1;
-    }
-    if (vornwireless::utils::CheckAndMakeDir(kConfigDir, 0755) != 0) {
+    HashPtr hash = SettingsHash(wan, ConvertInterface(wan));
+    if (hash == nullptr || vornwireless::utils::CheckAndMakeDir(kConfigDir, 0755) != 0) {
         return -1;
     }
     QLIBCSysUnlink(file.c_str());
@@ -152,13 +154,8 @@ int Router6Attr::LoadConfig() {
     const std::string converted = ConvertInterface(wan);
     const std::string tunnel = kTunnelPrefix + converted;
     const std::string file = kConfigPrefix + converted;
-    if (!IsValidInterfaceName(converted)) {
-        VORN_LOG(LOG_ERR, "Invalid wan interface [%s]", wan.c_str());
-        return -1;
-    }
-    HashPtr hash = NewHash();
+    HashPtr hash = SettingsHash(wan, converted);
     if (hash == nullptr) {
-        VORN_LOG(LOG_ERR, "Failed to allocate PQLIBSZHASH");
         return -1;
     }
     if (QLIBCFileExist(file.c_str()) != 1) {
