@@ -263,8 +263,12 @@ void Router6Attr::GetPrefSection(const QLIBSZHASH* hash) {
     }
 }
 
+// inet_pton reads up to a NUL: a text holding one would pass and then be cut on its way out.
 bool IsIPv6Prefix(const std::string& text) {
     const size_t slash = text.find('/');
+    if (text.find('\0') != std::string::npos) {
+        return false;
+    }
     if (slash == std::string::npos || slash + 1 == text.size() || text.size() - slash > 4) {
         return false;
     }
@@ -279,7 +283,7 @@ bool IsIPv6Prefix(const std::string& text) {
 
 bool IsIPv4Address(const std::string& text) {
     in_addr address;
-    return inet_pton(AF_INET, text.c_str(), &address) == 1;
+    return text.find('\0') == std::string::npos && inet_pton(AF_INET, text.c_str(), &address) == 1;
 }
 
 bool IsTunnelType(const std::string& type) {

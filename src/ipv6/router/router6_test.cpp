@@ -72,20 +72,28 @@ TEST_F(Router6Test, SettingsKeepTheirFileAndJsonFormsUnderThePppoeName) {
     EXPECT_EQ(request, Parse(R"({"wan": "eth0", "is_default_gateway": false,
         "prefix": "2002:0a01:0203::/48", "local_addr_v6": "2002:0a01:0203::1/16",
         "remote_addr_v4": "192.88.99.1"})"));
+    const auto loopback = Router6Factory::new6to4Attr(Parse(R"({"wan": "lo"})"));
+    ASSERT_TRUE(loopback != nullptr);
+    EXPECT_EQ(loopback->ToJson()["config"]["prefix"], "2002:7f00:0001::/48");
+    EXPECT_EQ(loopback->type + " " + loopback->local_addr_v4, "6to4 127.0.0.1");
 }
 
 TEST_F(Router6Test, UntrustedSettingsAreRefusedBeforeAnythingRuns) {
-    const char* good = R"("prefix": "2001:db8::/48", "remote_addr_v4": "198.51.100.1",
-                          "local_addr_v6": "2001:db8::2/64")";
+    // On lo, which has an IPv4 address everywhere, only the bad field can refuse a request.
+    const std::string good = R"("wan": "lo", "prefix": "2001:db8::/48",
+        "remote_addr_v4": "198.51.100.1", "local_addr_v6": "2001:db8::2/64")";
+    EXPECT_TRUE(Router6Factory::new6in4Attr(Parse("{" + good + "}")) != nullptr);
     for (const char* bad :
-         {R"("wan": "eth0;reboot")", R"("wan": "eth0.100.1001")", R"("wan": 7)",
-          R"("wan": "eth0", "prefix": "2001:db8::/129")",
-          R"("wan": "eth0", "prefix": "2001:db8::")", R"("wan": "eth0", "remote_addr_v4": "10.1")",
-          R"("wan": "eth0", "local_addr_v6": "2001:db8::2\n/64")"}) {
+         {R"("wan": "lo;reboot")", R"("wan": 7)", R"("prefix": "2001:db8::/129")",
+          R"("prefix": "2001:db8::")", R"("remote_addr_v4": "10.1")",
+          R"("remote_addr_v4": "10.0.0.1\u0000")", R"("local_addr_v6": "2001:db8::2\n/64")",
+          R"("is_default_gateway": "yes")"}) {
         // The later of two equal keys wins.
-        Json::Value request = Parse("{" + std::string(good) + ", " + bad + "}");
-        EXPECT_TRUE(Router6Factory::newRouterV6Instance("6in4", request) == nullptr) << bad;
+        EXPECT_TRUE(Router6Factory::new6in4Attr(Parse("{" + good + ", " + bad + "}")) == nullptr)
+            << bad;
     }
+    EXPECT_FALSE(IsValidWan("eth0.100.1001", "6in4"));  // "6in4-" + name is too long
+    EXPECT_TRUE(IsValidWan("eth0.100.1001", "native"));
     root_.WriteFile(std::string(kSettings) + "eth0",
                     "[conf]\n\ttype=6in4\n\twan=eth0\n\tprefix=2001:db8::/48\n[addr]\n"
                     "\tlocal_addr_v4=300.1.1.1\n\tremote_addr_v4=198.51.100.1\n"
@@ -98,6 +106,7 @@ TEST_F(Router6Test, UntrustedSettingsAreRefusedBeforeAnythingRuns) {
     EXPECT_TRUE(log_.Contains("Invalid lan interface [../br0]"));
     EXPECT_THAT(root_.Calls(), IsEmpty());
     EXPECT_EQ(root_.ReadFile("/proc/sys/net/ipv6/conf/all/forwarding"), "0\n");
+    EXPECT_TRUE(Tunnel6in4(Router6Attr()).SetSysConfig(true));  // no WAN: nothing to mark
 }
 
 TEST_F(Router6Test, RoutersRunTheirProgramsAndTakeTheirGatewayPlace) {
