@@ -2,6 +2,7 @@
 
 #include <strings.h>
 
+#include <cstdio>
 #include <cstdlib>
 #include <fstream>
 #include <vector>
@@ -9,10 +10,12 @@
 #include "platform/qlib_crypt.h"
 #include "platform/qlibc_container.h"
 #include "platform/qlibc_file.h"
+#include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "platform/shell_command.h"
 #include "utils/interface_name.h"
 #include "utils/log.h"
+#include "utils/process.h"
 #include "wifi/settings/enum_map.h"
 
 namespace vornwireless {
@@ -23,6 +26,8 @@ namespace {
 constexpr const char* kSettingsFile = "/etc/vorninfo.conf";
 constexpr const char* kFactoryFile = "/etc.defaults/vorninfo.conf";
 constexpr const char* kTopologyKey = "net_topology";
+constexpr const char* kSupportKey = "support_net_topology";
+constexpr const char* kRltModuleDir = "/usr/vorn/lib/modules/";
 constexpr int kValueSize = 256;
 constexpr std::string::size_type kMaxIndexDigits = 4;
 constexpr std::size_t kMaxModeLines = 16;
@@ -56,6 +61,22 @@ int IndexAfter(const std::string& prefix, const std::string& name) {
         return -1;
     }
     return std::atoi(digits.c_str());
+}
+
+bool IsSettingYes(const char* key) {
+    return QLIBCFileCheckKeyValue(kSettingsFile, key, "yes", 0) == 1;
+}
+
+bool IsPlainWord(const std::string& text) {
+    return !text.empty() && text.size() <= 64 &&
+           text.find_first_not_of(
+               "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789_.-") ==
+               std::string::npos;
+}
+
+bool IsModuleFile(const std::string& module) {
+    return IsPlainWord(module) && module.size() > 3 &&
+           module.compare(module.size() - 3, 3, ".ko") == 0;
 }
 
 }  // namespace
@@ -185,6 +206,125 @@ int WriteTopology(WIFI_TOPOLOGY topology) {
         return -1;
     }
     return 0;
+}
+
+int GetTopologyString(std::string& out) {
+    if (!vornwireless::utils::IsProcessAlive("vornwifid")) {
+        out = "none";
+        return 0;
+    }
+    const WIFI_TOPOLOGY topology = ReadTopology();
+    if (topology == WIFI_TOPOLOGY_ERROR) {
+        VORN_LOG(LOG_ERR, "Failed to read current topology");
+        return -1;
+    }
+    out = EnumMap<WIFI_TOPOLOGY>::EnumToString(topology);
+    return 0;
+}
+
+int SetSupportNetTopology(bool support) {
+    if (QLIBCFileSetKeyValue(kSettingsFile, kSupportKey, support ? "yes" : "no") != 0) {
+        VORN_LOG(LOG_ERR, "Failed to set key [%s] in file [%s]", kSupportKey, kSettingsFile);
+        return -1;
+    }
+    return 0;
+}
+
+bool IsSupportTopology() {
+    return IsSettingYes(kSupportKey);
+}
+
+bool HasWifiDongle() {
+    return IsSettingYes("has_wifi_dongle");
+}
+
+std::string GetBridgeName(WIFI_TOPOLOGY topology) {
+    switch (topology) {
+        case WIFI_TOPOLOGY_BRIDGE:
+            return "br0";
+        case WIFI_TOPOLOGY_ROUTER:
+            return "lbr0";
+        default:
+            return "";
+    }
+}
+
+int GetFirstExistentSlaveByBridge(const std::string& bridge, std::string& out) {
+    out.clear();
+    if (!vornwireless::utils::IsValidInterfaceName(bridge)) {
+        VORN_LOG(LOG_ERR, "Wrong Parameter.");
+        return -1;
+    }
+    // Whole-name match: "br0" must not pick up the lines of lbr0 or gbr0.
+    const std::string command =
+        "/usr/vorn/sbin/brctl show | awk -v b='" + bridge + "' '$1 == b {print $4}'";
+    std::vector<std::string> lines;
+    if (vorn::platform::ReadShellCommandLines(command, lines, 1, kValueSize) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to execute command");
+        return -1;
+    }
+    if (!lines.empty()) {
+        out = lines.front();
+    }
+    return 0;
+}
+
+bool IsSectionExist(const std::string& file, const std::string& section) {
+    if (!IsPlainWord(section)) {
+        VORN_LOG(LOG_ERR, "Wrong Parameter.");
+        return false;
+    }
+    if (QLIBCFileExist(file.c_str()) != 1) {
+        VORN_LOG(LOG_ERR, "File %s doesn't exist", file.c_str());
+        return false;
+    }
+    QLIBSZLIST* sections = nullptr;
+    bool found = false;
+    if (QLIBCFileEnumSection(file.c_str(), &sections) > 0) {
+        for (int i = 0; i < QLIBCSzListCount(sections) && !found; ++i) {
+            found = strcasecmp(QLIBCSzListGet(sections, i), section.c_str()) == 0;
+        }
+    }
+    QLIBCSzListFree(sections);
+    return found;
+}
+
+int GetSignalStrength(const std::string& ifname) {
+    if (!vornwireless::utils::IsValidInterfaceName(ifname)) {
+        return -1;
+    }
+    std::string line;
+    const std::string command = "/sbin/iwconfig '" + ifname + "' | grep 'Link Quality'";
+    if (vorn::platform::ReadShellCommandLine(command, line, kValueSize) != 0) {
+        return -1;
+    }
+    const std::string::size_type at = line.find("Link Quality=");
+    int quality = 0, scale = 0;
+    if (at == std::string::npos) {
+        return -1;
+    }
+    const int parsed = std::sscanf(line.c_str() + at, "Link Quality=%d/%d", &quality, &scale);
+    if (parsed == 2 && scale > 0) {
+        return quality * 100 / scale;
+    }
+    return parsed >= 1 ? quality : -1;
+}
+
+int InsertRLTKernelModule(const std::string& module) {
+    if (!IsModuleFile(module)) {
+        return -1;
+    }
+    const std::string path = kRltModuleDir + module;
+    return QLIBCExecl("/sbin/insmod", QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN,
+                      vorn::platform::RootPath(path).c_str(), nullptr);
+}
+
+int RemoveRLTKernelModule(const std::string& module) {
+    if (!IsModuleFile(module)) {
+        return -1;
+    }
+    const std::string name = module.substr(0, module.size() - 3);
+    return QLIBCExecl("/sbin/rmmod", QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN, name.c_str(), nullptr);
 }
 
 }  // namespace utils

@@ -47,6 +47,30 @@ int DecryptCipherText(const std::string& cipher, std::string& plain);
 // read error or an unknown word gives WIFI_TOPOLOGY_ERROR.
 WIFI_TOPOLOGY ReadTopology();
 int WriteTopology(WIFI_TOPOLOGY topology);
+// The topology's word while the wifi daemon "vornwifid" runs, else "none". 0, or -1 when the
+// stored topology cannot be read.
+int GetTopologyString(std::string& out);
+// Key "support_net_topology" ("yes"/"no") and "has_wifi_dongle" of "/etc/vorninfo.conf".
+int SetSupportNetTopology(bool support);
+bool IsSupportTopology();
+bool HasWifiDongle();
+
+// "br0" for the bridge topology, "lbr0" for router, "" for the others.
+std::string GetBridgeName(WIFI_TOPOLOGY topology);
+// The first member interface of the bridge as "brctl show" lists it (the bridge's whole name
+// matched), "" when it has none. 0, or -1 for a bad name or a command that cannot run.
+int GetFirstExistentSlaveByBridge(const std::string& bridge, std::string& out);
+// Whether the section file holds "[section]" (any case). False, logged, for a missing file or a
+// section name that is not a plain word.
+bool IsSectionExist(const std::string& file, const std::string& section);
+// The link quality iwconfig reports for the interface, as a percentage when it reports "N/M";
+// -1 when there is none.
+int GetSignalStrength(const std::string& ifname);
+
+// The RLT radio's driver: "/sbin/insmod" "/usr/vorn/lib/modules/MODULE" and "/sbin/rmmod" NAME
+// (MODULE without ".ko"). 0 or -1.
+int InsertRLTKernelModule(const std::string& module = "rlt_wifi.ko");
+int RemoveRLTKernelModule(const std::string& module = "rlt_wifi.ko");
 
 }  // namespace utils
 }  // namespace wifi
