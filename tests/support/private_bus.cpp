@@ -7,7 +7,6 @@
 #include <sys/wait.h>
 
 #include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -50,20 +49,12 @@ PrivateBus::PrivateBus()
         ADD_FAILURE() << "dbus-daemon printed no address: " << daemon_->Stderr();
         return;
     }
-    const char* saved = std::getenv(kBusVariable);
-    hadAddress_ = saved != nullptr;
-    savedAddress_ = hadAddress_ ? saved : "";
+    savedAddress_ = std::make_unique<SavedVariable>(kBusVariable);
     address_ = out.substr(0, out.find('\n'));
     setenv(kBusVariable, address_.c_str(), 1);
 }
 
-PrivateBus::~PrivateBus() {
-    if (Started() && hadAddress_) {
-        setenv(kBusVariable, savedAddress_.c_str(), 1);
-    } else if (Started()) {
-        unsetenv(kBusVariable);
-    }
-}
+PrivateBus::~PrivateBus() = default;
 
 pid_t PrivateBus::Pid() const {
     return daemon_->Pid();

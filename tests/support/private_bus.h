@@ -12,6 +12,7 @@ namespace vorn {
 namespace test {
 
 class DaemonProcess;
+class SavedVariable;
 
 // A private session bus (a dbus-daemon of our own). While the object lives,
 // DBUS_SESSION_BUS_ADDRESS points at it, for this process and every program it starts; the
@@ -34,8 +35,7 @@ class PrivateBus {
   private:
     std::unique_ptr<DaemonProcess> daemon_;
     std::string address_;
-    std::string savedAddress_;
-    bool hadAddress_ = false;
+    std::unique_ptr<SavedVariable> savedAddress_;
 };
 
 // A program started with the current environment (VORN_ROOT, DBUS_SESSION_BUS_ADDRESS, PATH),

@@ -1,7 +1,6 @@
 #include "support/sim_root.h"
 
 #include <cstdio>
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -37,33 +36,15 @@ void RunMakeRoot(SimRoot::Kind kind, const std::string& dir) {
     }
 }
 
-void SaveVariable(const char* name, std::string& value, bool& had) {
-    const char* current = std::getenv(name);
-    had = current != nullptr;
-    value = had ? current : "";
-}
-
-void RestoreVariable(const char* name, const std::string& value, bool had) {
-    if (had) {
-        setenv(name, value.c_str(), 1);
-    } else {
-        unsetenv(name);
-    }
-}
-
 }  // namespace
 
 SimRoot::SimRoot(Kind kind) : dir_(MakeTempDir("vorn-root")) {
     RunMakeRoot(kind, dir_);
-    SaveVariable("VORN_ROOT", savedRoot_, hadRoot_);
-    SaveVariable("PATH", savedPath_, hadPath_);
     setenv("VORN_ROOT", dir_.c_str(), 1);
     platform::PrefixPathWithRoot();
 }
 
 SimRoot::~SimRoot() {
-    RestoreVariable("VORN_ROOT", savedRoot_, hadRoot_);
-    RestoreVariable("PATH", savedPath_, hadPath_);
     std::error_code ignored;
     fs::remove_all(dir_, ignored);
 }

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "support/log_capture.h"
+#include "support/waiting.h"
 
 namespace vorn {
 namespace test {
@@ -40,11 +41,9 @@ class SimRoot {
     void ClearCalls() const;
 
   private:
+    SavedVariable savedRoot_{"VORN_ROOT"};
+    SavedVariable savedPath_{"PATH"};
     std::string dir_;
-    std::string savedRoot_;
-    std::string savedPath_;
-    bool hadRoot_ = false;
-    bool hadPath_ = false;
 };
 
 // Base fixture of unit tests: a fresh simulated root and captured log lines for every test.

@@ -3,8 +3,10 @@
 #include <gtest/gtest.h>
 #include <stdlib.h>
 
+#include <cstdlib>
 #include <filesystem>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "platform/shell_command.h"
@@ -31,6 +33,20 @@ std::string Shell(const std::string& command) {
         text += line + "\n";
     }
     return text;
+}
+
+SavedVariable::SavedVariable(std::string name) : name_(std::move(name)) {
+    if (const char* value = std::getenv(name_.c_str())) {
+        value_ = value;
+    }
+}
+
+SavedVariable::~SavedVariable() {
+    if (value_) {
+        setenv(name_.c_str(), value_->c_str(), 1);
+    } else {
+        unsetenv(name_.c_str());
+    }
 }
 
 std::string MakeTempDir(const std::string& prefix) {

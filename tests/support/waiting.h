@@ -3,6 +3,7 @@
 
 #include <chrono>
 #include <functional>
+#include <optional>
 #include <string>
 
 namespace vorn {
@@ -15,6 +16,19 @@ bool WaitFor(const std::function<bool()>& done,
 // Every output line of a shell command line, standard error included, its absolute programs run
 // under the root as the library's own command lines are.
 std::string Shell(const std::string& command);
+
+// Remembers an environment variable (or its absence) and puts it back when it goes.
+class SavedVariable {
+  public:
+    explicit SavedVariable(std::string name);
+    ~SavedVariable();
+    SavedVariable(const SavedVariable&) = delete;
+    SavedVariable& operator=(const SavedVariable&) = delete;
+
+  private:
+    std::string name_;
+    std::optional<std::string> value_;
+};
 
 // A new folder under TMPDIR (or /tmp) named prefix and a random tail; "" when none can be made.
 std::string MakeTempDir(const std::string& prefix);
