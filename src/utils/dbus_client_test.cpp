@@ -2,20 +2,15 @@
 
 #include <gmock/gmock.h>
 
-#include <cstdlib>
-#include <optional>
-
 #include "support/log_capture.h"
+#include "support/waiting.h"
 
 namespace vornwireless::utils {
 namespace {
 
 TEST(GatewayAnnouncementTest, FailuresOnADeadBusReturnFalseOrMinusOneWithTheirMessage) {
-    const char* variable = "DBUS_SESSION_BUS_ADDRESS";
-    const char* saved = std::getenv(variable);
-    const std::optional<std::string> previous =
-        saved ? std::optional<std::string>(saved) : std::nullopt;
-    setenv(variable, "unix:path=/nonexistent/vorn-dead-bus", 1);
+    const vorn::test::SavedVariable saved("DBUS_SESSION_BUS_ADDRESS");
+    setenv("DBUS_SESSION_BUS_ADDRESS", "unix:path=/nonexistent/vorn-dead-bus", 1);
     vorn::test::LogCapture log;
     EXPECT_FALSE(SetGatewayInfo("eth0", "GTYPE_V4", "10.0.0.1", "10.0.0.1", "ethernet", 0, true));
     EXPECT_FALSE(DelGatewayInfo("wlan0", "GTYPE_V4", false));
@@ -29,7 +24,6 @@ TEST(GatewayAnnouncementTest, FailuresOnADeadBusReturnFalseOrMinusOneWithTheirMe
             log.Lines(),
             ::testing::Contains(::testing::MatchesRegex("dbus_client\\.cpp:[0-9]+ " + message)));
     }
-    previous ? setenv(variable, previous->c_str(), 1) : unsetenv(variable);
 }
 
 }  // namespace

@@ -8,8 +8,7 @@ namespace vornwireless::utils {
 namespace {
 
 TEST(StringContainerTest, ParsesJoinsAndSlices) {
-    EXPECT_EQ(ParseToVector(" a , ,b", ","), StringVector({"a", "b"}));
-    EXPECT_EQ(ParseToVector("x;y z", "; "), StringVector({"x", "y", "z"}));
+    EXPECT_EQ(ParseToVector(" a , ;b", ",;"), StringVector({"a", "b"}));
     EXPECT_TRUE(ParseToVector(nullptr, ",").empty());
     EXPECT_EQ(ParseToSet("b,a,b", ","), StringSet({"a", "b"}));
     EXPECT_EQ(ConvertToString(ParseToJsonArray("b, a", ",")), R"(["b","a"])");

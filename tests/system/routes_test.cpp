@@ -59,15 +59,26 @@ class RouteSystemTest : public vorn::test::PeerNamespaceTest {
     module::RouteModule module_;
 };
 
-TEST_F(RouteSystemTest, IPv4DefaultRouteGoesThroughTheFirstUsableUplink) {
+TEST_F(RouteSystemTest, DefaultRoutesGoThroughTheFirstUsableUplinkAndReplaceTheOldOnes) {
     AddGateways();
+    Ip("-6 route add default via 2001:db8:1::1 dev u1");
+    Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V6","ifname":"u1","priority":0,)"
+         R"("gateway":"::","class":"ethernet"})");
+    Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V6","ifname":"u2","priority":-1,)"
+         R"("gateway":"2001:db8:2::1","class":"ethernet","refresh":true})");
     Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V4"})");
     EXPECT_EQ(Shell("/sbin/ip -4 route show default"), "default via 10.1.0.1 dev u1 \n");
+    std::string routes = Shell("/sbin/ip -6 route show default");
+    EXPECT_THAT(routes, HasSubstr("default dev u1 "));
+    EXPECT_THAT(routes, Not(HasSubstr("via")));
 
     PullCable("1");
-    Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V4"})");
+    Send(R"({"method":"REFRESH_GATEWAY","type":"ALL"})");
     EXPECT_EQ(Shell("/sbin/ip -4 route show default"), "default via 10.2.0.1 dev u2 \n");
     EXPECT_EQ(module_.GetList(module::GTYPE_V4).front().ifname, "u2");
+    routes = Shell("/sbin/ip -6 route show default");
+    EXPECT_THAT(routes, HasSubstr("default via 2001:db8:2::1 dev u2 "));
+    EXPECT_THAT(routes, Not(HasSubstr("u1")));
 
     // Nothing usable: the gateway in place stays.
     Send(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4","ifname":"u2","slave":true})");
@@ -76,25 +87,6 @@ TEST_F(RouteSystemTest, IPv4DefaultRouteGoesThroughTheFirstUsableUplink) {
     EXPECT_THAT(root_->ReadFile("/etc/iproute2/config/gateway_v4_priority"),
                 HasSubstr("[1]\n\tclass=ethernet\n\tdns=\n\tgateway=10.2.0.1\n\tifname=u2\n"
                           "\tslave=yes\n"));
-}
-
-TEST_F(RouteSystemTest, IPv6DefaultRouteReplacesTheOldOnes) {
-    AddGateways();
-    Ip("-6 route add default via 2001:db8:1::1 dev u1");
-    Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V6","ifname":"u1","priority":0,)"
-         R"("gateway":"::","class":"ethernet"})");
-    Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V6","ifname":"u2","priority":-1,)"
-         R"("gateway":"2001:db8:2::1","class":"ethernet","refresh":true})");
-    std::string routes = Shell("/sbin/ip -6 route show default");
-    EXPECT_THAT(routes, HasSubstr("default dev u1 "));
-    EXPECT_THAT(routes, Not(HasSubstr("via")));
-
-    PullCable("1");
-    Send(R"({"method":"REFRESH_GATEWAY","type":"ALL"})");
-    routes = Shell("/sbin/ip -6 route show default");
-    EXPECT_THAT(routes, HasSubstr("default via 2001:db8:2::1 dev u2 "));
-    EXPECT_THAT(routes, Not(HasSubstr("u1")));
-    EXPECT_EQ(Shell("/sbin/ip -4 route show default"), "default via 10.2.0.1 dev u2 \n");
 }
 
 TEST_F(RouteSystemTest, PolicyTableAndRulesComeAndGo) {
