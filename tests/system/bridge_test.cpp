@@ -1,0 +1,118 @@
+// The bridges of the router and bridge topologies laid out with the real brctl and ip on veth
+// slaves; dnsmasq checks every DHCP file they write and serves a lease from lbr0's.
+#include <gmock/gmock.h>
+#include <sys/stat.h>
+
+#include "platform/qlibc_file.h"
+#include "support/peer_namespace.h"
+#include "support/waiting.h"
+#include "wifi/bridge/bridge_base.h"
+#include "wifi/utils/utils.h"
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+using ::testing::HasSubstr;
+using vorn::test::RunProgram;
+using vorn::test::WaitFor;
+
+constexpr const char* kLeaseFile = "/etc/dhcpd/lbr0.leases";
+
+class BridgeSystemTest : public vorn::test::PeerNamespaceTest {
+  protected:
+    void SetUp() override {
+        PeerNamespaceTest::SetUp();
+        if (IsSkipped() || HasFatalFailure()) {
+            return;
+        }
+        AddPeer("br-lan", "wlan0", 11, "c0", 21);
+        AddPeer("br-guest", "gwlan0", 12, "g0", 22);
+        AddPeer("br-wan", "eth0", 13, "e0", 23);
+        root_->WriteFile("/etc.defaults/vorninfo.conf", "model=\"kite-a\"\n");
+        root_->WriteFile("/usr/vorn/etc/wifi/wifi_topology_router",
+                         root_->ReadFile("/usr/vorn/etc.defaults/wifi/wifi_topology_router_kite"));
+        root_->WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth0",
+                         "DEVICE=eth0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
+    }
+
+    void TearDown() override {
+        BridgeBase::ClearBridgeList();
+        PeerNamespaceTest::TearDown();
+    }
+
+    static bool IsSlave(const std::string& bridge, const std::string& slave) {
+        struct stat info;
+        return stat(("/sys/class/net/" + bridge + "/brif/" + slave).c_str(), &info) == 0;
+    }
+
+    std::string DnsmasqTest(const std::string& file) {
+        std::string output;
+        RunProgram({"/usr/sbin/dnsmasq", "--test", "--conf-file=" + root_->Path(file)},
+                   std::chrono::seconds(10), &output, &output);
+        return output + root_->ReadFile(file);
+    }
+};
+
+TEST_F(BridgeSystemTest, RouterAndBridgeTopologiesRunWithRealBridgesAndDnsmasq) {
+    ASSERT_EQ(utils::WriteTopology(WIFI_TOPOLOGY_ROUTER), 0);
+    ASSERT_EQ(BridgeBase::Initialize(), 0) << ::testing::PrintToString(log_.Lines());
+    EXPECT_TRUE(IsSlave("lbr0", "wlan0"));
+    EXPECT_TRUE(IsSlave("gbr0", "gwlan0"));
+    EXPECT_FALSE(IsSlave("lbr0", "eth0"));
+    EXPECT_THAT(vorn::test::Shell("/sbin/ip -4 -o addr show dev lbr0"),
+                HasSubstr("192.168.100.1/24"));
+    std::string first;
+    ASSERT_EQ(utils::GetFirstExistentSlaveByBridge("gbr0", first), 0);
+    EXPECT_EQ(first, "gwlan0");
+
+    BridgeBase* lbr0 = BridgeBase::GetBridge("lbr0");
+    BridgeConfig stateful = lbr0->GetConfig();
+    stateful.ipv6Prefix = "2001:db8:100::";
+    stateful.ipv6Pdns = "2001:db8::53";
+    stateful.dhcpv6Type = "stateful";
+    stateful.dhcpv6RangeBegin = "2001:db8:100::100";
+    stateful.dhcpv6RangeEnd = "2001:db8:100::1ff";
+    ASSERT_EQ(lbr0->Apply(stateful), 0);
+    EXPECT_THAT(vorn::test::Shell("/sbin/ip -6 -o addr show dev lbr0"),
+                HasSubstr("2001:db8:100::1/64"));
+    for (const char* file :
+         {"/etc/dhcpd/dhcpd-lbr0-lbr00.conf", "/etc/dhcpd/dhcpd-lbr0-lbr0v60.conf",
+          "/etc/dhcpd/dhcpd-gbr0-gbr00.conf", "/etc/dhcpd/dhcpd-gbr0-gbr0v60.conf"}) {
+        EXPECT_THAT(DnsmasqTest(file), HasSubstr("syntax check OK")) << file;
+    }
+
+    const vorn::test::DaemonProcess& dnsmasq = Start(
+        {"/usr/sbin/dnsmasq", "-k", "--log-facility=-", "--bind-interfaces", "--no-resolv",
+         "--dhcp-authoritative", "--conf-file=" + root_->Path("/etc/dhcpd/dhcpd-lbr0-lbr00.conf"),
+         "--dhcp-leasefile=" + root_->Path(kLeaseFile),
+         "--pid-file=" + root_->Path("/etc/dhcpd/lbr0.pid")});
+    std::string output;
+    EXPECT_EQ(RunProgram({"/sbin/ip", "netns", "exec", "br-lan", "/usr/bin/busybox", "udhcpc", "-f",
+                          "-q", "-n", "-i", "c0", "-s", "/bin/true"},
+                         std::chrono::seconds(30), &output, &output),
+              0)
+        << output;
+    EXPECT_TRUE(WaitFor([&] {
+        return root_->ReadFile(kLeaseFile).find(" 192.168.100.") != std::string::npos;
+    })) << dnsmasq.Stderr();
+
+    // Down to the bridge topology: the ports leave lbr0, br0 takes eth0 and its address.
+    ASSERT_EQ(BridgeBase::DisableAll(), 0);
+    ASSERT_EQ(BridgeBase::DisableTopologyAll(), 0);
+    EXPECT_FALSE(IsSlave("lbr0", "wlan0"));
+    ASSERT_EQ(utils::WriteTopology(WIFI_TOPOLOGY_BRIDGE), 0);
+    ASSERT_EQ(BridgeBase::SwitchTopology(WIFI_TOPOLOGY_BRIDGE), 0);
+    ASSERT_EQ(BridgeBase::EnableTopologyAll(), 0) << ::testing::PrintToString(log_.Lines());
+    ASSERT_EQ(BridgeBase::EnableAll(), 0);
+    EXPECT_TRUE(IsSlave("br0", "eth0"));
+    EXPECT_TRUE(IsSlave("br0", "wlan0"));
+    EXPECT_THAT(vorn::test::Shell("/sbin/ip -4 -o addr show dev br0"), HasSubstr("10.9.0.2/24"));
+    ASSERT_EQ(utils::GetFirstExistentSlaveByBridge("br0", first), 0);
+    EXPECT_EQ(first, "eth0");
+    EXPECT_THAT(DnsmasqTest("/etc/dhcpd/dhcpd-br0-br0v60.conf"), HasSubstr("syntax check OK"));
+}
+
+}  // namespace
+}  // namespace wifi
+}  // namespace vornwireless
