@@ -78,11 +78,12 @@ class NetlinkModuleSystemTest : public ::testing::Test {
                                      root_->Path("/tmp/" + point) + "\n");
         chmod(root_->Path(script).c_str(), 0755);
     }
-    std::vector<std::string> Runs(const std::string& point, const std::string& prefix) const {
+    // The hook's runs whose line contains part.
+    std::vector<std::string> Runs(const std::string& point, const std::string& part) const {
         std::istringstream text(root_->ReadFile("/tmp/" + point));
         std::vector<std::string> lines;
         for (std::string line; std::getline(text, line);) {
-            if (line.rfind(prefix, 0) == 0) {
+            if (line.find(part) != std::string::npos) {
                 lines.push_back(line);
             }
         }
@@ -129,12 +130,10 @@ TEST_F(NetlinkModuleSystemTest, EveryChangeRunsItsHandlersOrHooksOnceAndBridgePo
     ASSERT_TRUE(WaitFor([&] { return Operstate("p0") == "up\n"; }));
     Barrier();
 
-    EXPECT_THAT(Handlers("v0"), ElementsAre("route-table-down v0", "link-down v0",
-                                            "route-table-up v0", "link-up v0"));
-    EXPECT_THAT(Handlers("v1"), ElementsAre("route-table-down v1", "link-down v1",
-                                            "route-table-up v1", "link-up v1"));
-    EXPECT_THAT(Handlers("p1"), ElementsAre("route-table-down p1", "link-down p1",
-                                            "route-table-up p1", "link-up p1"));
+    for (const std::string name : {"v0", "v1", "p1"}) {
+        EXPECT_THAT(Handlers(name), ElementsAre("route-table-down " + name, "link-down " + name,
+                                                "route-table-up " + name, "link-up " + name));
+    }
     // The bridge port's carrier went and came back; the bridge kept running on q0.
     EXPECT_THAT(Handlers("p0"), IsEmpty());
     EXPECT_THAT(Handlers("br0"), IsEmpty());
@@ -167,15 +166,10 @@ TEST_F(NetlinkModuleSystemTest, EveryChangeRunsItsHandlersOrHooksOnceAndBridgePo
                             "v0|10.11.0.2|10.11.0.1|24"));
     EXPECT_THAT(Runs("ipv6_change", "v0|"),
                 ElementsAre("v0||fd11::1|64", "v0|fd11::1|fd11::2|64", "v0|fd11::2|fd11::3|64"));
-    EXPECT_THAT(Runs("gateway_change", "NEW|v0|10.99.0.0"),
-                ElementsAre("NEW|v0|10.99.0.0|10.11.0.254"));
-    EXPECT_THAT(Runs("gateway_change", "DEL|v0|10.99.0.0"),
-                ElementsAre("DEL|v0|10.99.0.0|10.11.0.254"));
-    EXPECT_THAT(Runs("gateway_change", "NEW|v0|10.11.0.0"),
-                ElementsAre("NEW|v0|10.11.0.0|0.0.0.0"));
-    EXPECT_THAT(Runs("gateway_change", "DEL|v0|10.11.0.0"),
-                ElementsAre("DEL|v0|10.11.0.0|0.0.0.0"));
-    EXPECT_THAT(Runs("gateway_change", "NEW|v0|10.98.0.0"), IsEmpty());
+    // Nothing of table 100.
+    EXPECT_THAT(Runs("gateway_change", "|v0|"),
+                ElementsAre("NEW|v0|10.11.0.0|0.0.0.0", "NEW|v0|10.99.0.0|10.11.0.254",
+                            "DEL|v0|10.99.0.0|10.11.0.254", "DEL|v0|10.11.0.0|0.0.0.0"));
     EXPECT_THAT(Handlers("v0"), IsEmpty());
 
     const NetlinkState state = module_->Snapshot();

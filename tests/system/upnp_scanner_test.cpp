@@ -2,9 +2,7 @@
 // end of a veth pair, the scanner's SSDP search and description download on this side.
 #include "network/module/upnpscanner.h"
 
-#include <arpa/inet.h>
 #include <gmock/gmock.h>
-#include <unistd.h>
 
 #include <filesystem>
 #include <fstream>
@@ -24,17 +22,6 @@ using vorn::test::WaitFor;
 constexpr char kServerAddress[] = "10.77.0.2";
 constexpr char kFriendlyName[] = "Vorn Test Media";
 constexpr char kModelName[] = "Vorn DLNA 7";
-
-bool AcceptsConnections(const char* address, std::uint16_t port) {
-    const int fd = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_in server{};
-    server.sin_family = AF_INET;
-    server.sin_port = htons(port);
-    inet_pton(AF_INET, address, &server.sin_addr);
-    const bool connected = connect(fd, reinterpret_cast<sockaddr*>(&server), sizeof server) == 0;
-    close(fd);
-    return connected;
-}
 
 // The entry the scanner keeps for the media server, or null.
 Json::Value ServerEntry(const Json::Value& list) {
@@ -73,8 +60,10 @@ class UpnpScannerSystemTest : public vorn::test::PeerNamespaceTest {
             Start({"/usr/sbin/minidlnad", "-d", "-f", dir + "/minidlna.conf", "-P",
                    dir + "/minidlna.pid"},
                   "dlna");
-        ASSERT_TRUE(WaitFor([] { return AcceptsConnections(kServerAddress, 8200); },
-                            std::chrono::seconds(10)))
+        const std::string connect = "/bin/bash -c 'echo >/dev/tcp/" + std::string(kServerAddress) +
+                                    "/8200' 2>/dev/null; echo $?";
+        ASSERT_TRUE(
+            WaitFor([&] { return vorn::test::Shell(connect) == "0\n"; }, std::chrono::seconds(10)))
             << server.Stdout() << server.Stderr();
     }
 
