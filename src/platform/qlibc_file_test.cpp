@@ -119,6 +119,7 @@ TEST_F(QlibcFileTest, SectionsWriteAndReadBack) {
         EXPECT_EQ(QLIBCFileHash2File(stream, "1", MakeHash(bad).get(), "\t%s=%s\n"), -1);
     }
     EXPECT_EQ(QLIBCFileHash2File(stream, "x]", pairs.get(), "\t%s=%s\n"), -1);
+    EXPECT_EQ(QLIBCFileHash2File(stream, "1", pairs.get(), "%s=%d\n"), -1);
     EXPECT_EQ(QLIBCFileHash2File(stream, "1", pairs.get(), "%s\n"), -1);
     std::fclose(stream);
     EXPECT_EQ(root_.ReadFile("/etc/w.conf"),

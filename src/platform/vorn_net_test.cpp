@@ -17,7 +17,7 @@ using VornNetTest = vorn::test::RootTest;
 const std::string kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-";
 const std::string kShow = "/sbin/ip -4 route show table main";
 
-TEST_F(VornNetTest, IfcfgRecordsReadAndApplyBack) {
+TEST_F(VornNetTest, IfcfgRecordsReadApplyBackAndRefuseMalformedOnes) {
     EXPECT_EQ(BlVORNLnxIsDHCP("eth0"), 1);
     EXPECT_EQ(BlVORNLnxIsDHCP("../network-scripts/ifcfg-eth0"), 0);
     VORN_NET_IF_CONFIG info;
@@ -43,10 +43,8 @@ TEST_F(VornNetTest, IfcfgRecordsReadAndApplyBack) {
     EXPECT_THAT(root_.ReadFile(kIfcfg + "eth1"), ::testing::HasSubstr("BOOTPROTO=dhcp\n"));
     EXPECT_THAT(root_.Calls(),
                 ElementsAre("/etc/rc.network restart-if eth1", "/etc/rc.network restart-if eth1"));
-}
 
-TEST_F(VornNetTest, IfcfgRefusesMalformedRecords) {
-    VORN_NET_IF_CONFIG info;
+    root_.ClearCalls();
     EXPECT_EQ(VORNNetIFGetInfo("eth9", 0, &info), -1);  // no file
     EXPECT_EQ(VORNNetIFGetInfo("eth0;x", 0, &info), -1);
     root_.WriteFile(kIfcfg + "eth1", "DEVICE=eth1\nIPADDR=10.0.0.300\n");

@@ -246,7 +246,8 @@ TEST_F(VornnetdTest, BadInputGetsAnErrorAndChangesNothing) {
         deep.insert(0, R"({"a":)");
     }
 
-    const std::vector<std::string> unparsable = {"not json", "", "[1]", "null", deep, huge};
+    const std::vector<std::string> unparsable = {"not json", R"({"type":)", "",   "[1]", R"("x")",
+                                                 "7",        "null",        deep, huge};
     for (const std::string& input : unparsable) {
         for (const Method& method : kMethods) {
             const Answer answer = CallService(method.name, input);
