@@ -69,9 +69,6 @@ TEST_F(QlibcFileTest, SectionFilesReadByTheLineRules) {
     }
     EXPECT_EQ(QLIBCFileEnumSection("/etc/missing.conf", &list), -1);
     EXPECT_EQ(QLIBCErrGet(), QLIBC_ERR_NOT_FOUND);
-    root_.WriteFile("/etc/empty.conf", "");
-    EXPECT_EQ(QLIBCFileEnumSection("/etc/empty.conf", &list), 0);
-    EXPECT_EQ(QLIBCSzListCount(list), 0);
     QLIBCSzListFree(list);
 }
 

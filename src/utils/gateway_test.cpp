@@ -28,7 +28,7 @@ class GatewayTest : public vorn::test::RootTest {
     Gateway gateway_;
 };
 
-TEST_F(GatewayTest, SetChangesBothGatewaysAndRecordsWhatChanged) {
+TEST_F(GatewayTest, SetChangesBothGatewaysRecordsWhatChangedAndStopsOnFailures) {
     Gateways("10.0.0.1", "10.0.0.1");
     EXPECT_EQ(gateway_.Set(IPAddress("10.0.0.1")), 0);
     EXPECT_THAT(root_.Calls(), ElementsAre(kShow));
@@ -51,6 +51,27 @@ TEST_F(GatewayTest, SetChangesBothGatewaysAndRecordsWhatChanged) {
     EXPECT_EQ(gateway_.Set(IPAddress("10.0.0.5")), 0);
     EXPECT_THAT(root_.ReadFile(kEvents), EndsWith("\t0x11801311\t10.0.0.6\t10.0.0.5\n"));
     EXPECT_TRUE(log_.Lines().empty());
+
+    // Platform failures stop Set with their messages.
+    root_.WriteFile(kEvents, "");
+    root_.Scenario("ip", "when -4 route show table main\nexit 2\n");
+    EXPECT_EQ(gateway_.Set(IPAddress("10.0.0.2")), -1);
+    EXPECT_TRUE(log_.Contains("gateway.cpp:"));
+    EXPECT_TRUE(log_.Contains(" get gateway failed [0x0B00]"));
+    Gateways("10.0.0.1", "10.0.0.1");
+    root_.Scenario("ip",
+                   "when -4 route show table main\nprint default via 10.0.0.1\n"
+                   "when -4 route replace *\nexit 2\n");
+    EXPECT_EQ(gateway_.Set(IPAddress("10.0.0.2")), -1);
+    EXPECT_TRUE(log_.Contains(" set gateway failed"));
+    // Nothing is rolled back: the configuration was already stored.
+    EXPECT_EQ(root_.ReadFile(kNetwork), "GATEWAY=10.0.0.2\n");
+    EXPECT_EQ(root_.ReadFile(kEvents), "");
+    // An IPv6 text is an address, but not one for the IPv4 default route.
+    root_.ClearCalls();
+    EXPECT_EQ(gateway_.Set(IPAddress("2001:db8::1")), -1);
+    EXPECT_TRUE(log_.Contains(" set gateway conf failed"));
+    EXPECT_THAT(root_.Calls(), ElementsAre(kShow));
 }
 
 TEST_F(GatewayTest, BackupPrefersTheRunningGatewayAndRestoreSetsIt) {
@@ -69,27 +90,6 @@ TEST_F(GatewayTest, BackupPrefersTheRunningGatewayAndRestoreSetsIt) {
     Gateways("10.0.0.1", "");
     EXPECT_EQ(gateway_.Restore(), 0);
     EXPECT_THAT(root_.Calls(), ElementsAre(kShow, kReplace + "10.0.0.9"));
-}
-
-TEST_F(GatewayTest, PlatformFailuresStopSetWithTheirMessages) {
-    root_.Scenario("ip", "when -4 route show table main\nexit 2\n");
-    EXPECT_EQ(gateway_.Set(IPAddress("10.0.0.2")), -1);
-    EXPECT_TRUE(log_.Contains("gateway.cpp:"));
-    EXPECT_TRUE(log_.Contains(" get gateway failed [0x0B00]"));
-    Gateways("10.0.0.1", "10.0.0.1");
-    root_.Scenario("ip",
-                   "when -4 route show table main\nprint default via 10.0.0.1\n"
-                   "when -4 route replace *\nexit 2\n");
-    EXPECT_EQ(gateway_.Set(IPAddress("10.0.0.2")), -1);
-    EXPECT_TRUE(log_.Contains(" set gateway failed"));
-    // Nothing is rolled back: the configuration was already stored.
-    EXPECT_EQ(root_.ReadFile(kNetwork), "GATEWAY=10.0.0.2\n");
-    EXPECT_FALSE(root_.Exists(kEvents));
-    // An IPv6 text is an address, but not one for the IPv4 default route.
-    root_.ClearCalls();
-    EXPECT_EQ(gateway_.Set(IPAddress("2001:db8::1")), -1);
-    EXPECT_TRUE(log_.Contains(" set gateway conf failed"));
-    EXPECT_THAT(root_.Calls(), ElementsAre(kShow));
 }
 
 }  // namespace

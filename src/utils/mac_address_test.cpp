@@ -9,7 +9,7 @@
 namespace vornwireless::utils {
 namespace {
 
-TEST(MacAddressTest, FormalizesBareHexKeepsCaseAndLogsWhatItCannotFormalize) {
+TEST(MacAddressTest, FormalizesBareHexKeepsCaseLogsWhatItCannotFormalizeAndWrapsAdding) {
     vorn::test::LogCapture log;
     EXPECT_EQ(MacAddress("001122AABBCC").ToString(), "00:11:22:AA:BB:CC");
     EXPECT_EQ(MacAddress("00:11:22:aa:bb:cc").ToString(), "00:11:22:aa:bb:cc");
@@ -27,9 +27,8 @@ TEST(MacAddressTest, FormalizesBareHexKeepsCaseAndLogsWhatItCannotFormalize) {
     EXPECT_EQ(notHex.ToString(), "00112233445G");
     EXPECT_TRUE(log.Contains(" Bad mac addr [00112233445G]"));
     EXPECT_EQ(notHex.Formalize(), -1);
-}
 
-TEST(MacAddressTest, AddingWrapsTheLastOctetModulo255WithoutCarry) {
+    // Adding wraps the last octet modulo 255, without carry.
     EXPECT_EQ((MacAddress("00:11:22:33:44:fe") + 1).ToString(), "00:11:22:33:44:00");
     EXPECT_EQ((MacAddress("AA:BB:CC:DD:EE:09") + 1).ToString(), "aa:bb:cc:dd:ee:0a");
     EXPECT_EQ((MacAddress("00:11:22:33:44:00") + -1).ToString(), "00:11:22:33:44:fe");
