@@ -358,6 +358,36 @@ int BridgeBase::RemoveSlave() {
     return RemoveSlave([](const std::string&) { return true; });
 }
 
+std::vector<std::string> BridgeBase::GetSlaveList() {
+    std::vector<std::string> slaves;
+    for (const auto& bridge : GetList()) {
+        const auto& own = bridge->config_.slaveList;
+        slaves.insert(slaves.end(), own.begin(), own.end());
+    }
+    return slaves;
+}
+
+int BridgeBase::GetWlanSlaveCount(const std::string& bridge) {
+    const BridgeBase* found = GetBridge(bridge);
+    if (found == nullptr) {
+        return -1;
+    }
+    const auto& slaves = found->config_.slaveList;
+    return static_cast<int>(std::count_if(slaves.begin(), slaves.end(), IsWirelessIf));
+}
+
+int BridgeBase::RefreshWlanSlaveList() {
+    if (RemoveSlaveWlan() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to remove Slave(wlan)");
+        return -1;
+    }
+    if (AddSlaveWlan() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to add slave(wlan)");
+        return -1;
+    }
+    return 0;
+}
+
 void BridgeBase::AddModifiedIfName(const std::string& ifname) {
     auto& names = ModifiedIfNames();
     if (std::find(names.begin(), names.end(), ifname) == names.end()) {
@@ -377,6 +407,11 @@ int BridgeBase::SetDefaultConfig(const BridgeConfig& config) {
 int BridgeBase::SetConfig(const BridgeConfig& config) {
     if (IsBridge(name_)) {
         return 0;
+    }
+    // Callers may build a configuration in code; its texts reach files and command lines too.
+    BridgeConfig checked;
+    if (BridgeConfig::FromFields(config.ToFields(), checked) != 0) {
+        return -1;
     }
     BridgeConfig& held = config_;
     const bool address =

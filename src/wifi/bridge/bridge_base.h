@@ -49,6 +49,12 @@ class BridgeBase {
     static int RemoveSlaveWlan();
     static int RemoveSlaveGwlan();
 
+    // The slaves of all bridges; the wireless slaves of one (-1 for an unknown bridge); the
+    // wireless slaves taken out of their bridges and put back.
+    static std::vector<std::string> GetSlaveList();
+    static int GetWlanSlaveCount(const std::string& bridge);
+    static int RefreshWlanSlaveList();
+
     static void AddModifiedIfName(const std::string& ifname);
     static void ClearModifiedIfName();
 

@@ -45,10 +45,11 @@ TEST_F(BridgeTest, TopologyFilesLoadByModel) {
     EXPECT_EQ(BridgeBase::CreateBridge("xbr0"), nullptr);
     root_.WriteFile("/usr/vorn/etc/wifi/wifi_topology_router",
                     root_.ReadFile("/usr/vorn/etc.defaults/wifi/wifi_topology_router_kite") +
-                        "[eth9]\nslave_list=eth9\n");
+                        "[eth9]\nslave_list=eth9\n[lbr01]\nap_ip_address=10.0.0.1\n");
     BridgeBase& guest = Load(WIFI_TOPOLOGY_ROUTER, "gbr0");
     EXPECT_EQ(BridgeBase::GetList().size(), 2u);
     EXPECT_TRUE(log_.Contains("Failed to create bridge [eth9]"));
+    EXPECT_TRUE(log_.Contains("Refused bridge config: the netmask is not a mask of the address"));
     // Guest values count on Kite models only.
     EXPECT_TRUE(guest.GetConfig().apIpAddress.IsEmpty());
     root_.WriteFile("/etc.defaults/vorninfo.conf", "model=\"kite-a\"\n");
@@ -131,8 +132,12 @@ TEST_F(BridgeTest, ApplyReloadsWhatChangedAndWritesDhcpFiles) {
         changed[bad.first] = bad.second;
         EXPECT_EQ(utils::GetConfig(changed, refused), -1) << bad.first;
     }
+    BridgeConfig injected = lbr0.GetConfig();
+    injected.ipv6Pdns = "::1,dhcp-script=/x";
+    EXPECT_EQ(lbr0.Apply(injected), -1);
     EXPECT_THAT(root_.Calls(), IsEmpty());
     EXPECT_EQ(root_.ReadFile("/usr/vorn/etc/wifi/wifi_topology_router"), files);
+    EXPECT_EQ(lbr0.GetConfig().ipv6Pdns, "2001:db8::1");
 
     BridgeConfig next = lbr0.GetConfig();
     next.apNetmask = "255.255.255.0";
