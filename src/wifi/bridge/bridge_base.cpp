@@ -445,11 +445,11 @@ int BridgeBase::Reload(bool flag, int (BridgeBase::*disable)(), int (BridgeBase:
         return 0;
     }
     if ((this->*disable)() != 0) {
-        VORN_LOG(LOG_ERR, "%s %s", disableFailed, GetNameC());
+        VORN_LOG(LOG_ERR, disableFailed, GetNameC());
         return -1;
     }
     if ((this->*enable)() != 0) {
-        VORN_LOG(LOG_ERR, "%s %s", enableFailed, GetNameC());
+        VORN_LOG(LOG_ERR, enableFailed, GetNameC());
         return -1;
     }
     return 0;
@@ -460,13 +460,13 @@ int BridgeBase::Apply(const BridgeConfig& config) {
     if (SetConfig(config) != 0) {
         VORN_LOG(LOG_ERR, "Failed to set config");
     } else if (Reload(reloadNat_, &BridgeBase::DisableNat, &BridgeBase::EnableNat,
-                      "Failed to disable nat for", "Failed to enable nat for") != 0 ||
+                      "Failed to disable nat for %s", "Failed to enable nat for %s") != 0 ||
                Reload(reloadDhcp_, &BridgeBase::DisableDhcp, &BridgeBase::EnableDhcp,
-                      "Failed to disable dhcp for", "Failed to enable dhcp for") != 0 ||
+                      "Failed to disable dhcp for %s", "Failed to enable dhcp for %s") != 0 ||
                Reload(reloadIPv6_, &BridgeBase::DisableIPv6, &BridgeBase::EnableIPv6,
-                      "Failed to disable IPv6 on", "Failed to disable IPv6 on") != 0 ||
+                      "Failed to disable IPv6", "Failed to disable IPv6") != 0 ||
                Reload(reloadDhcpv6_, &BridgeBase::DisableDhcpv6, &BridgeBase::EnableDhcpv6,
-                      "Failed to disable dhcpv6 for", "Failed to enable dhcpv6 for") != 0) {
+                      "Failed to disable dhcpv6 for %s", "Failed to enable dhcpv6 for %s") != 0) {
     } else if (SetTopologyFile(config_) != 0) {
         VORN_LOG(LOG_ERR, "Failed to set topology file for %s", GetNameC());
     } else if (RestoreActualTopologyFile() != 0) {

@@ -124,7 +124,8 @@ class BridgeBase {
     BridgeConfig config_;
 
   private:
-    // Disable, then enable, when flag is set; each failure logged with its text and the name.
+    // Disable, then enable, when flag is set; each failure logged through its format ("%s": the
+    // bridge name, or none).
     int Reload(bool flag, int (BridgeBase::*disable)(), int (BridgeBase::*enable)(),
                const char* disableFailed, const char* enableFailed);
     static int ForEachSlave(const NamePredicate& matches, bool add);
