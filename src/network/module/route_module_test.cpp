@@ -75,7 +75,6 @@ TEST_F(RouteModuleTest, PrioritiesSlavesAndCopiesPlaceEntries) {
     Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth6"})");
     Send(R"({"method":"DEL_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth9"})");
     EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth5", "eth1", "eth2", "eth3", "eth4", "eth0"));
-    EXPECT_THAT(Names(GTYPE_V6), IsEmpty());
     const Json::Value list = Send(R"({"method":"GET_GATEWAY_LIST_DATA","type":"GTYPE_V4"})");
     EXPECT_EQ(list[5]["priority"].asInt(), 5);
     EXPECT_EQ(list[5]["gateway"].asString(), "10.0.0.1");
@@ -171,61 +170,6 @@ TEST_F(RouteModuleTest, ListsReadBackInTextOrderFromRequestsOfTwoThreads) {
     EXPECT_TRUE(log_.Contains("Unknown type to read config"));
 }
 
-TEST_F(RouteModuleTest, RefreshInstallsTheFirstUsableEntry) {
-    Add("GTYPE_V4", "eth3", -1, R"(,"gateway":"10.3.0.1")");
-    Add("GTYPE_V4", "eth0", -1, R"(,"gateway":"10.0.0.1","class":"ethernet")");
-    Add("GTYPE_V4", "wlan0", -1, R"(,"gateway":"10.2.0.1","class":"ethernet")");
-    Add("GTYPE_V4", "eth1", -1, R"(,"gateway":"10.1.0.1","class":"ethernet")");
-    Slave("eth3", "true");
-    root_.Scenario("ip",
-                   "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n"
-                   "when route add default via 10.2.0.1 dev wlan0\nexit 2\n");
-    root_.Scenario("ethtool", "when eth0\nprint \tLink detected: no\n");
-    const std::string files = Files();
-    root_.ClearCalls();
-    Send(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V4"})");
-    EXPECT_THAT(root_.Calls(),
-                ElementsAre("/sbin/ip -4 route show table main", "/sbin/ip route show table main",
-                            "/sbin/ip -4 route show table main", "/sbin/ip -4 route del default",
-                            "/usr/vorn/bin/ethtool eth0",
-                            "/sbin/ip route add default via 10.2.0.1 dev wlan0",
-                            "/usr/vorn/bin/ethtool eth1",
-                            "/sbin/ip route add default via 10.1.0.1 dev eth1"));
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth0", "wlan0", "eth3"));
-    EXPECT_EQ(Files(), files);
-
-    // None works: the old gateway comes back.
-    root_.Scenario("ip",
-                   "when -4 route show table main\nprint default via 10.9.0.1 dev eth9\n"
-                   "when route add *\nexit 2\n");
-    Send(R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth1","priority":-2,)"
-         R"("refresh":true})");
-    EXPECT_EQ(root_.Calls().back(), "/sbin/ip -4 route replace default via 10.9.0.1");
-    EXPECT_THAT(Names(GTYPE_V4), ElementsAre("eth1", "eth0", "wlan0", "eth3"));
-
-    // IPv6 replaces every default route; "::" means a route through the device alone.
-    Add("GTYPE_V6", "eth0", -1, R"(,"gateway":"fe80::1","class":"ethernet")");
-    Add("GTYPE_V6", "sit0", -1, R"(,"gateway":"::")");
-    Add("GTYPE_V6", "eth1", -1, R"(,"gateway":"fe80::2")");
-    root_.Scenario("ip",
-                   "when -6 route show table main\nprint default via fe80::9 dev eth9\n"
-                   "print default via fe80::8 dev eth8\n"
-                   "when -6 route add default dev sit0\nexit 2\n");
-    root_.ClearCalls();
-    Send(R"({"method":"REFRESH_GATEWAY","type":"ALL"})");
-    EXPECT_THAT(root_.Calls(),
-                testing::IsSupersetOf({"/sbin/ip -6 route delete default",
-                                       "/sbin/ip -6 route add default dev sit0",
-                                       "/sbin/ip -6 route add default via fe80::2 dev eth1"}));
-    EXPECT_THAT(Names(GTYPE_V6), ElementsAre("eth1", "eth0", "sit0"));
-
-    RouteModule empty;
-    root_.ClearCalls();
-    EXPECT_FALSE(IsEthernetLinkDetected("eth0;touch /tmp/x"));
-    EXPECT_EQ(empty.RefreshDefaultGatewayV4(), 0);
-    EXPECT_THAT(root_.Calls(), IsEmpty());
-}
-
 TEST_F(RouteModuleTest, OnlyHarmfulRequestsAreRefusedAndTheySayWhy) {
     Add("GTYPE_V4", "eth0", 0, R"(,"gateway":"10.0.0.1","dns":"10.0.0.53")");
     Add("GTYPE_V6", "eth0", 0, R"(,"gateway":"fe80::1")");
@@ -283,6 +227,7 @@ TEST_F(RouteModuleTest, OnlyHarmfulRequestsAreRefusedAndTheySayWhy) {
         Send(request);
         EXPECT_EQ(Files(), files) << request;
     }
+    EXPECT_FALSE(IsEthernetLinkDetected("eth0;touch /tmp/x"));
     EXPECT_THAT(root_.Calls(), IsEmpty());
     // Each unknown type is logged by the refresh it asked for, and by the add.
     EXPECT_EQ(log_.Matching("Unknown type to add info").size(), 6u);
