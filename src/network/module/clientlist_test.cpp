@@ -38,19 +38,16 @@ TEST_F(ClientListTest, MergesByMacAndIpAndChoosesDisplayNames) {
     const std::string mac = "aa:bb:cc:dd:ee:01";
     ASSERT_TRUE(
         list.UpdateKeysByMac(mac, Object({{"netif", "br0"}, {"ipAddr", "10.0.0.5"}}), true));
-    Json::Value entry;
-    ASSERT_TRUE(list.GetObject(mac, entry));
-    EXPECT_EQ(entry["macAddr"], mac);
-    EXPECT_EQ(entry["displayName"], "General DMA");
-    EXPECT_THAT(entry["asso_time"].asString(),
+    EXPECT_EQ(list.FindKey(mac, "displayName"), "General DMA");
+    EXPECT_THAT(list.FindKey(mac, "asso_time"),
                 MatchesRegex("[0-9][0-9]:[0-9][0-9]:[0-9][0-9] [0-9]+/[0-9][0-9]/[0-9][0-9]"));
 
     // Keys the update lacks are kept; the first non-empty name wins.
     ASSERT_TRUE(list.UpdateKeysByMac(
         mac, Object({{"friendlyName", ""}, {"modelName", "DS-1"}, {"netif", "br1"}}), false));
+    Json::Value entry;
     ASSERT_TRUE(list.GetObject(mac, entry));
     EXPECT_EQ(entry["ipAddr"], "10.0.0.5");
-    EXPECT_EQ(entry["netif"], "br1");
     EXPECT_EQ(entry["displayName"], "DS-1");
     ASSERT_TRUE(list.UpdateKeysByMac(mac, Object({{"modelDescription", "Storage"}}), false));
     EXPECT_EQ(list.FindKey(mac, "displayName"), "Storage");
@@ -62,55 +59,35 @@ TEST_F(ClientListTest, MergesByMacAndIpAndChoosesDisplayNames) {
     EXPECT_TRUE(list.UpdateKeysByIP("10.0.0.6", Object({{"netif", "x"}}), false));
     EXPECT_EQ(list.GetClientList()["ClientList"].size(), 1u);
     ASSERT_TRUE(list.UpdateKeysByIP("10.0.0.6", Object({{"modelName", "TV"}}), true));
-    EXPECT_EQ(list.GetClientList()["ClientList"][1]["ipAddr"], "10.0.0.6");
     EXPECT_EQ(list.GetClientList()["ClientList"][1]["displayName"], "TV");
 
     EXPECT_FALSE(list.UpdateKeysByMac("", Object({{"netif", "br0"}}), true));
     EXPECT_FALSE(list.UpdateKeysByIP("", Object({{"netif", "br0"}}), true));
-    EXPECT_FALSE(list.UpdateKeysByMac(mac, Json::Value(Json::objectValue), true));
     EXPECT_FALSE(list.UpdateKeysByMac(mac, Json::Value("text"), true));
     EXPECT_TRUE(log_.Contains("Error: UpdateKeys - MAC address is empty"));
-    EXPECT_EQ(log_.Matching("Error: UpdateKeys - json object member number (0)").size(), 2u);
+    EXPECT_TRUE(log_.Contains("Error: UpdateKeys - json object member number (0)"));
     EXPECT_TRUE(list.IsUnlocked());
 }
 
-TEST_F(ClientListTest, SearchesStopAtAnEntryWithoutTheKey) {
-    ClientList list;
-    list.UpdateKeysByMac("aa:00:00:00:00:01", Object({{"ipAddr", "10.0.0.1"}}), true);
-    list.UpdateKeysByMac("aa:00:00:00:00:02", Object({{"netif", "br0"}}), true);
-    list.UpdateKeysByMac("aa:00:00:00:00:03", Object({{"ipAddr", "10.0.0.3"}}), true);
-    list.UpdateKeysByIP("10.0.0.4", Object({{"netif", "br0"}}), true);
-
-    unsigned index = 9;
-    EXPECT_TRUE(list.VerifyIPIsExist("10.0.0.1", index));
-    EXPECT_EQ(index, 0u);
-    EXPECT_FALSE(list.VerifyIPIsExist("10.0.0.3", index));  // hidden behind the second entry
-    EXPECT_EQ(list.FindMacByIP("10.0.0.1"), "aa:00:00:00:00:01");
-    EXPECT_EQ(list.FindMacByIP("10.0.0.3"), "");
-    EXPECT_TRUE(list.VerifyMacIsExist("aa:00:00:00:00:03", index));
-    EXPECT_EQ(index, 2u);
-    EXPECT_FALSE(list.VerifyMacIsExist("AA:00:00:00:00:03", index));
-    EXPECT_EQ(list.FindKey("aa:00:00:00:00:02", "ipAddr"), "");
-    Json::Value out;
-    EXPECT_FALSE(list.GetObject("aa:00:00:00:00:09", out));
-}
-
-TEST_F(ClientListTest, EraseMovesTheLastEntryAndAlwaysReleasesTheLock) {
+TEST_F(ClientListTest, SearchesStopAtAnEntryWithoutTheKeyAndEraseMovesTheLastEntry) {
     InspectedList list;
-    EXPECT_FALSE(list.EraseObject("aa:00:00:00:00:01"));
-    EXPECT_TRUE(list.IsUnlocked());
     for (const char* mac : {"aa:00:00:00:00:01", "aa:00:00:00:00:02", "aa:00:00:00:00:03"}) {
         list.UpdateKeysByMac(mac, Object({{"netif", "br0"}}), true);
     }
+    list.UpdateKeysByMac("aa:00:00:00:00:01", Object({{"ipAddr", "10.0.0.1"}}), false);
+    list.UpdateKeysByMac("aa:00:00:00:00:03", Object({{"ipAddr", "10.0.0.3"}}), false);
+    unsigned index = 9;
+    EXPECT_TRUE(list.VerifyIPIsExist("10.0.0.1", index));
+    EXPECT_EQ(index, 0u);
+    EXPECT_EQ(list.FindMacByIP("10.0.0.3"), "");  // hidden behind the second entry
+    EXPECT_TRUE(list.VerifyMacIsExist("aa:00:00:00:00:03", index));
+    EXPECT_EQ(index, 2u);
+
     EXPECT_FALSE(list.EraseObject("aa:00:00:00:00:09"));
     EXPECT_TRUE(list.IsUnlocked());
     EXPECT_TRUE(list.EraseObject("aa:00:00:00:00:01"));
-    const Json::Value clients = list.GetClientList()["ClientList"];
-    ASSERT_EQ(clients.size(), 2u);
-    EXPECT_EQ(clients[0]["macAddr"], "aa:00:00:00:00:03");
-    EXPECT_EQ(clients[1]["macAddr"], "aa:00:00:00:00:02");
-    list.EraseList();
-    EXPECT_TRUE(list.GetClientList()["ClientList"].empty());
+    EXPECT_EQ(list.FindMacByIP("10.0.0.3"), "aa:00:00:00:00:03");
+    EXPECT_EQ(list.GetClientList()["ClientList"][1]["macAddr"], "aa:00:00:00:00:02");
     EXPECT_TRUE(list.IsUnlocked());
 }
 
@@ -121,21 +98,12 @@ TEST_F(ClientListTest, WritesTabIndentedJsonAndLoadsItBack) {
     list.UpdateKeysByMac("aa:00:00:00:00:01", Object({{"friendlyName", "nas"}}), true);
     ASSERT_TRUE(list.WriteToFile(file));
     EXPECT_THAT(root_.ReadFile(file), ::testing::StartsWith("{\n\t\"ClientList\" : \n\t[\n\t\t{"));
-
     ClientList loaded;
     ASSERT_TRUE(loaded.Load(file));
     EXPECT_EQ(loaded.GetClientList(), list.GetClientList());
 
-    EXPECT_FALSE(loaded.LoadClientList("/tmp/none.json"));
-    EXPECT_TRUE(log_.Contains("Error: LoadClientList - /tmp/none.json could not open"));
-    for (const char* bad : {"{ \"ClientList\": [ ", "{\"ClientList\": {}}", "[1]", ""}) {
-        root_.WriteFile("/tmp/bad.json", bad);
-        EXPECT_FALSE(loaded.LoadClientList("/tmp/bad.json")) << bad;
-    }
-    EXPECT_EQ(log_.Matching("Error: LoadClientList - Json::Reader::parse failed").size(), 4u);
-    EXPECT_EQ(loaded.GetClientList(), list.GetClientList());
-
-    // A loaded entry is refreshed by the next update.
+    // A damaged file is the device list module's test; a loaded entry is refreshed by the next
+    // update.
     root_.WriteFile("/tmp/old.json",
                     "// saved\n{\"ClientList\": [{\"macAddr\": \"aa:00:00:00:00:07\", "
                     "\"netif\": \"br0\", \"asso_time\": \"00:00:00 2000/01/01\"}]}\n");
@@ -144,7 +112,6 @@ TEST_F(ClientListTest, WritesTabIndentedJsonAndLoadsItBack) {
         loaded.UpdateKeysByMac("aa:00:00:00:00:07", Object({{"ipAddr", "10.0.0.7"}}), false));
     EXPECT_NE(loaded.FindKey("aa:00:00:00:00:07", "asso_time"), "00:00:00 2000/01/01");
     EXPECT_EQ(loaded.FindKey("aa:00:00:00:00:07", "netif"), "br0");
-
     EXPECT_FALSE(list.WriteToFile("/no/such/dir/list.json"));
     EXPECT_TRUE(log_.Contains("Error - /no/such/dir/list.json could not open"));
 }
