@@ -15,7 +15,6 @@ namespace vornwireless {
 namespace utils {
 namespace {
 
-constexpr std::size_t kLineBytes = 1024;
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN;
 
 // The real paths a logical path or pattern names; none, nothing is run. Programs run without a
