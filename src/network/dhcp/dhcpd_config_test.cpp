@@ -92,10 +92,7 @@ TEST_F(DhcpdConfigTest, FilesHoldDnsmasqLinesByteForByte) {
     DHCPD_CONF pxe = Subnet4("eth0", "192.168.1.210");
     pxe.type = SERVICE_TYPE_PXE;
     Set(pxe.boot, "pxelinux.0");
-    const DHCPD_CONF wpad = Service(SERVICE_TYPE_WPAD, "eth0");
-    ASSERT_EQ(DhcpdConfig::saveConf({v4, Subnet4("eth0", "192.168.1.150"), v6, pxe, wpad}, "eth0",
-                                    SERVICE_TYPE_ALL),
-              5);
+    ASSERT_EQ(DhcpdConfig::saveConf({v4, v6, pxe}, "eth0", SERVICE_TYPE_ALL), 3);
 
     EXPECT_EQ(Read("dhcpd-eth0-eth00.conf"),
               "interface=eth0.5\n"
@@ -104,9 +101,6 @@ TEST_F(DhcpdConfigTest, FilesHoldDnsmasqLinesByteForByte) {
               "dhcp-option=tag:eth00,option:domain-search,lan.example\n"
               "dhcp-option=tag:eth00,option:domain-name,lan.example\n"
               "dhcp-option=tag:eth00,option:dns-server,192.168.1.1\n");
-    EXPECT_EQ(Read("dhcpd-eth0-eth01.conf"),
-              "interface=eth0\n"
-              "dhcp-range=set:eth01,192.168.1.150,192.168.1.200,255.255.255.0,86400\n");
     EXPECT_EQ(Read("dhcpd-eth0-eth0v60.conf"),
               "interface=eth0\n"
               "dhcp-range=set:eth0v60,2001:db8::100,2001:db8::1ff,64,86400\n"
@@ -116,7 +110,6 @@ TEST_F(DhcpdConfigTest, FilesHoldDnsmasqLinesByteForByte) {
               "dhcp-range=set:eth0pxe,192.168.1.210,192.168.1.200,255.255.255.0,86400\n"
               "dhcp-boot=tag:eth0pxe,pxelinux.0\n"
               "dhcp-vendorclass=set:pxe,PXEClient\n");
-    EXPECT_EQ(Read("wpad-eth0.conf"), "dhcp-option=tag:eth0,252\n");
 }
 
 TEST_F(DhcpdConfigTest, SavedServicesLoadBackAndFewerServicesDropTheRest) {
