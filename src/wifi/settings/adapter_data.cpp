@@ -18,6 +18,13 @@ namespace vornwireless {
 namespace wifi {
 namespace {
 
+// SetReloadData as 0 or 1, joined with '|' rather than '||' so that every field is compared and
+// assigned whatever came before.
+template <typename T>
+int Changed(T& stored, const T& incoming) {
+    return SetReloadData(stored, incoming) ? 1 : 0;
+}
+
 constexpr const char* kWifiDir = "/usr/vorn/etc/wifi/";
 constexpr const char* kObsoleteClientFile = "/usr/vorn/etc/wifi/wifi_client_obsolete";
 constexpr const char* kHostapdDir = "/etc/hostapd";
@@ -464,39 +471,36 @@ int AdapterData::SetConfig(const AdapterConfig& config) {
 
 int AdapterData::SetAPConfig(const AdapterConfig& n) {
     AdapterConfig& c = *config_;
-    // Bitwise or: every field is compared and assigned, whatever came before.
-    if (SetReloadData(c.enabled, n.enabled) | SetReloadData(c.guest_enabled, n.guest_enabled)) {
+    if (Changed(c.enabled, n.enabled) | Changed(c.guest_enabled, n.guest_enabled)) {
         reload_.restart = true;
         reload_.guest_rule = true;
     }
     const bool restart =
-        SetReloadData(c.ssid, n.ssid) | SetReloadData(c.display_ssid, n.display_ssid) |
-        SetReloadData(c.mode, n.mode) | SetReloadData(c.bandwidth, n.bandwidth) |
-        SetReloadData(c.channel, n.channel) | SetReloadData(c.wmm_enabled, n.wmm_enabled) |
-        SetReloadData(c.CountryCode, n.CountryCode) |
-        SetReloadData(c.CountryRegion, n.CountryRegion) |
-        SetReloadData(c.CountryRegionABand, n.CountryRegionABand) |
-        SetReloadData(c.security, n.security) | SetReloadData(c.encryption, n.encryption) |
-        SetReloadData(c.password, n.password) | SetReloadData(c.auth_server_ip, n.auth_server_ip) |
-        SetReloadData(c.auth_server_Port, n.auth_server_Port) |
-        SetReloadData(c.auth_server_shared_secret, n.auth_server_shared_secret) |
-        SetReloadData(c.guest_support, n.guest_support) |
-        SetReloadData(c.guest_ssid, n.guest_ssid) |
-        SetReloadData(c.guest_display_ssid, n.guest_display_ssid) |
-        SetReloadData(c.guest_max_num_client, n.guest_max_num_client) |
-        SetReloadData(c.guest_security, n.guest_security) |
-        SetReloadData(c.guest_encryption, n.guest_encryption) |
-        SetReloadData(c.guest_password, n.guest_password) |
-        SetReloadData(c.guest_allow_access_guest, n.guest_allow_access_guest) |
-        SetReloadData(c.mac_filter_policy, n.mac_filter_policy) |
-        SetReloadData(c.mac_filter_rules, n.mac_filter_rules);
+        Changed(c.ssid, n.ssid) | Changed(c.display_ssid, n.display_ssid) |
+        Changed(c.mode, n.mode) | Changed(c.bandwidth, n.bandwidth) |
+        Changed(c.channel, n.channel) | Changed(c.wmm_enabled, n.wmm_enabled) |
+        Changed(c.CountryCode, n.CountryCode) | Changed(c.CountryRegion, n.CountryRegion) |
+        Changed(c.CountryRegionABand, n.CountryRegionABand) | Changed(c.security, n.security) |
+        Changed(c.encryption, n.encryption) | Changed(c.password, n.password) |
+        Changed(c.auth_server_ip, n.auth_server_ip) |
+        Changed(c.auth_server_Port, n.auth_server_Port) |
+        Changed(c.auth_server_shared_secret, n.auth_server_shared_secret) |
+        Changed(c.guest_support, n.guest_support) | Changed(c.guest_ssid, n.guest_ssid) |
+        Changed(c.guest_display_ssid, n.guest_display_ssid) |
+        Changed(c.guest_max_num_client, n.guest_max_num_client) |
+        Changed(c.guest_security, n.guest_security) |
+        Changed(c.guest_encryption, n.guest_encryption) |
+        Changed(c.guest_password, n.guest_password) |
+        Changed(c.guest_allow_access_guest, n.guest_allow_access_guest) |
+        Changed(c.mac_filter_policy, n.mac_filter_policy) |
+        Changed(c.mac_filter_rules, n.mac_filter_rules);
     reload_.restart = reload_.restart || restart;
     reload_.tx_power = SetReloadData(c.tx_power, n.tx_power) || reload_.tx_power;
     reload_.schedule = SetReloadData(c.schedule_enabled, n.schedule_enabled);
     reload_.guest_schedule =
         SetReloadData(c.guest_schedule_enabled, n.guest_schedule_enabled) || reload_.guest_schedule;
-    if (SetReloadData(c.guest_allow_access_lan, n.guest_allow_access_lan) |
-        SetReloadData(c.guest_allow_access_http_https_only, n.guest_allow_access_http_https_only)) {
+    if (Changed(c.guest_allow_access_lan, n.guest_allow_access_lan) |
+        Changed(c.guest_allow_access_http_https_only, n.guest_allow_access_http_https_only)) {
         reload_.guest_rule = true;
     }
     c.schedule = n.schedule;
