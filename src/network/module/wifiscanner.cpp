@@ -3,14 +3,13 @@
 #include <regex.h>
 
 #include <cerrno>
-#include <climits>
-#include <cstdlib>
 #include <cstring>
 #include <sstream>
 #include <vector>
 
 #include "platform/qlib_net.h"
 #include "platform/shell_command.h"
+#include "utils/decimal.h"
 #include "utils/interface_name.h"
 #include "utils/log.h"
 
@@ -38,20 +37,6 @@ std::string Word(const std::string& line, std::size_t position) {
         }
     }
     return word;
-}
-
-bool ParseInt(const std::string& text, int& value) {
-    if (text.empty()) {
-        return false;
-    }
-    char* end = nullptr;
-    errno = 0;
-    const long parsed = std::strtol(text.c_str(), &end, 10);
-    if (errno != 0 || *end != '\0' || parsed < INT_MIN || parsed > INT_MAX) {
-        return false;
-    }
-    value = static_cast<int>(parsed);
-    return true;
 }
 
 bool IsStation(const std::string& mac) {
@@ -157,7 +142,7 @@ int WifiScanner::GetIwDevInfo(Json::Value& obj) {
             obj["transferTX"] = Word(line, 2);
         } else if (line.find("signal avg") != std::string::npos) {
             int dbm = 0;
-            if (ParseInt(Word(line, 2), dbm)) {
+            if (vornwireless::utils::ParseDecimal(Word(line, 2), dbm)) {
                 obj["signalstrength"] = ConvertDbmToPercent(dbm);
             }
             break;
