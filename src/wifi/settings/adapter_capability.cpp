@@ -8,6 +8,7 @@
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "platform/shell_command.h"
+#include "utils/interface_name.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
 #include "wifi/settings/adapter_capability_kite_model.h"
@@ -48,6 +49,11 @@ bool IsInterfaceUp(const std::string& name) {
 }  // namespace
 
 AdapterCapability* AdapterCapability::Create(const std::string& name) {
+    // The name reaches the probes' command lines.
+    if (!vornwireless::utils::IsValidInterfaceName(name)) {
+        VORN_LOG(LOG_ERR, "Refused interface name [%s]", name.c_str());
+        return nullptr;
+    }
     if (utils::IsKiteBBuiltInWlan(name)) {
         return new AdapterCapabilityRLT(name);
     }

@@ -37,6 +37,7 @@ class AdapterCapabilityTest : public vorn::test::RootTest {
 };
 
 TEST_F(AdapterCapabilityTest, VerifyOrderAndLimits) {
+    EXPECT_EQ(AdapterCapability::Create("wlan0';reboot'"), nullptr);
     Capability general(AdapterCapability::Create("wlan0"));
     EXPECT_EQ(general->GetMode(), (std::vector<WIFI_MODE>{WIFI_MODE_B, WIFI_MODE_G, WIFI_MODE_N,
                                                           WIFI_MODE_BN, WIFI_MODE_GN}));
