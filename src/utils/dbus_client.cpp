@@ -85,5 +85,32 @@ bool RefreshGateway(const std::string& type) {
     return true;
 }
 
+bool SetSlaveGatewayInfo(const std::string& ifname, const std::string& type, bool slave) {
+    Json::Value info = Announcement(ifname, type);
+    info["slave"] = slave;
+    NetClient client;
+    if (client.SetSlaveData(info) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to SetSlaveData on [%s]", ifname.c_str());
+        return false;
+    }
+    return true;
+}
+
+bool CopyGatewayInfo(const std::string& type, const std::string& source,
+                     const std::string& destination, bool deleteSource) {
+    Json::Value info(Json::objectValue);
+    info["type"] = type;
+    info["interface_source"] = source;
+    info["interface_destination"] = destination;
+    info["interface_source_delete"] = deleteSource;
+    NetClient client;
+    if (client.CopyGatewayData(info) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to CopyGatewayData from [%s] to [%s]", source.c_str(),
+                 destination.c_str());
+        return false;
+    }
+    return true;
+}
+
 }  // namespace utils
 }  // namespace vornwireless

@@ -17,6 +17,12 @@ bool DelGatewayInfo(const std::string& ifname, const std::string& type, bool ref
 int GetGatewayPriority(const std::string& ifname, const std::string& type);
 // Makes the route module recompute the default gateway of type.
 bool RefreshGateway(const std::string& type);
+// Marks ifname's record as a bridge slave (a slave's gateway is never installed).
+bool SetSlaveGatewayInfo(const std::string& ifname, const std::string& type, bool slave);
+// Gives destination the record of source, at source's place; source's record goes when
+// deleteSource is set.
+bool CopyGatewayInfo(const std::string& type, const std::string& source,
+                     const std::string& destination, bool deleteSource);
 
 }  // namespace utils
 }  // namespace vornwireless

@@ -70,6 +70,8 @@ TEST(GatewayAnnouncementTest, TheRouteModuleGetsExactlyTheAnnouncedKeys) {
         EXPECT_EQ(GetGatewayPriority("eth0", "GTYPE_V4"), 4);
         EXPECT_EQ(GetGatewayPriority("br0", "GTYPE_V4"), 0);
         EXPECT_TRUE(RefreshGateway("GTYPE_V6"));
+        EXPECT_TRUE(SetSlaveGatewayInfo("eth0", "GTYPE_V4", true));
+        EXPECT_TRUE(CopyGatewayInfo("GTYPE_V6", "eth0", "br0", false));
 
         RecordingRouteModule& module = *RecordingRouteModule::instance;
         EXPECT_EQ(
@@ -81,6 +83,12 @@ TEST(GatewayAnnouncementTest, TheRouteModuleGetsExactlyTheAnnouncedKeys) {
         EXPECT_EQ(module.Request(2), Parse(R"({"method":"GET_GATEWAY_DATA_BY_INTERFACE",)"
                                            R"("type":"GTYPE_V4","ifname":"eth0"})"));
         EXPECT_EQ(module.Request(4), Parse(R"({"method":"REFRESH_GATEWAY","type":"GTYPE_V6"})"));
+        EXPECT_EQ(module.Request(5), Parse(R"({"method":"SET_SLAVE_DATA","type":"GTYPE_V4",)"
+                                           R"("ifname":"eth0","slave":true})"));
+        EXPECT_EQ(module.Request(6),
+                  Parse(R"({"method":"COPY_GATEWAY_DATA","type":"GTYPE_V6",)"
+                        R"("interface_source":"eth0","interface_destination":"br0",)"
+                        R"("interface_source_delete":false})"));
 
         server.QuitLoop();
         loop.join();

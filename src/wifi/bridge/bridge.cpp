@@ -3,6 +3,7 @@
 #include "platform/qlibc_file.h"
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
+#include "utils/dbus_client.h"
 #include "utils/file.h"
 #include "utils/log.h"
 
@@ -80,6 +81,50 @@ int Bridge::DisableTopology() {
     if (vornwireless::utils::CopyIfcfgIPv6Attrs(GetName(), slave) != 0) {
         VORN_LOG(LOG_ERR, "Failed to copy ipv6 attrs from %s to %s", GetNameC(), slave.c_str());
         return -1;
+    }
+    // Else eth0 would stay a slave in the route module and its gateway never be used again.
+    if (ResetGatewayInfo() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to reset data");
+        return -1;
+    }
+    return 0;
+}
+
+// The bridge stands in for its slave: the slave's records move to the bridge's name at the
+// same place, and the slave's own stay behind marked as a slave, so no default route uses it.
+int Bridge::CreateGatewayInfo() {
+    const std::string slave = PrimarySlave();
+    if (slave.empty()) {
+        return -1;
+    }
+    for (const char* family : {"v4", "v6"}) {
+        const std::string type = GatewayType(family);
+        if (!vornwireless::utils::CopyGatewayInfo(type, slave, GetName(), false)) {
+            VORN_LOG(LOG_ERR, "Failed to copy %s gateway info from [%s] to [%s]", family,
+                     slave.c_str(), GetNameC());
+            return -1;
+        }
+        if (!vornwireless::utils::SetSlaveGatewayInfo(slave, type, true)) {
+            VORN_LOG(LOG_ERR, "Failed to set slave data for [%s] to %s gateway list.",
+                     slave.c_str(), family);
+            return -1;
+        }
+    }
+    return 0;
+}
+
+// The bridge's records (and what the route module learnt on it) go back to the slave's name.
+int Bridge::ResetGatewayInfo() {
+    const std::string slave = PrimarySlave();
+    if (slave.empty()) {
+        return -1;
+    }
+    for (const char* family : {"v4", "v6"}) {
+        if (!vornwireless::utils::CopyGatewayInfo(GatewayType(family), GetName(), slave, true)) {
+            VORN_LOG(LOG_ERR, "Failed to copy %s gateway info from [%s] to [%s]", family,
+                     GetNameC(), slave.c_str());
+            return -1;
+        }
     }
     return 0;
 }

@@ -14,6 +14,8 @@ class Bridge : public BridgeBase {
 
     int CreateConfig() override;
     int DisableTopology() override;
+    int CreateGatewayInfo() override;
+    int ResetGatewayInfo() override;
     int EnableNat() override { return 0; }
     int DisableNat() override { return 0; }
     // Suspends (and resumes) the primary slave's own DHCP server through "enable_bak".

@@ -9,6 +9,7 @@
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "utils/config.h"
+#include "utils/dbus_client.h"
 #include "utils/interface_name.h"
 #include "utils/ip_address.h"
 #include "utils/log.h"
@@ -104,22 +105,11 @@ bool IsDhcpv6Type(const std::string& type) {
     return type == "ra-only" || type == "ra-stateless" || type == "stateful";
 }
 
-int AppendDnsServers(int family, const char* open, const char* close, std::string& out) {
-    QLIBSZLIST* servers = nullptr;
-    const int count = VORNNetDNSServerListGet(family, &servers);
-    if (count < 0) {
-        QLIBCSzListFree(servers);
-        VORN_LOG(LOG_ERR, "get dns failed");
-        return -1;
+void AppendDnsServers(const std::vector<std::string>& servers, const char* open,
+                      const char* close, std::string& out) {
+    for (const auto& server : servers) {
+        out += std::string(out.empty() ? "" : ",") + open + server + close;
     }
-    if (count == 0) {
-        VORN_LOG(LOG_DEBUG, "No dns list found.");
-    }
-    for (int i = 0; i < count; ++i) {
-        out += std::string(out.empty() ? "" : ",") + open + QLIBCSzListGet(servers, i) + close;
-    }
-    QLIBCSzListFree(servers);
-    return 0;
 }
 
 std::string TopologyFile(WIFI_TOPOLOGY topology) {
@@ -152,6 +142,10 @@ int SectionConfig(const std::string& name, BridgeConfig::Fields fields, BridgeCo
 }  // namespace
 
 WIFI_TOPOLOGY BridgeBase::topology_ = WIFI_TOPOLOGY_ERROR;
+
+std::string GatewayType(const std::string& family) {
+    return family == "v4" ? "GTYPE_V4" : "GTYPE_V6";
+}
 
 bool IsWiredIf(const std::string& name) {
     return HasPrefix(name, "eth");
@@ -487,9 +481,33 @@ int BridgeBase::SetOnBoot(bool on) {
     return 0;
 }
 
+std::optional<std::vector<std::string>> BridgeBase::GetDnsServerList(int family) const {
+    QLIBSZLIST* list = nullptr;
+    const int count = VORNNetDNSServerListGet(family, &list);
+    if (count < 0) {
+        QLIBCSzListFree(list);
+        VORN_LOG(LOG_ERR, "get dns failed");
+        return std::nullopt;
+    }
+    if (count == 0) {
+        VORN_LOG(LOG_DEBUG, "No dns list found.");
+    }
+    std::vector<std::string> servers;
+    for (int i = 0; i < count; ++i) {
+        servers.emplace_back(QLIBCSzListGet(list, i));
+    }
+    QLIBCSzListFree(list);
+    return servers;
+}
+
 int BridgeBase::GetV4DnsServerList(std::string& out) const {
+    const auto servers = GetDnsServerList(4);
+    if (!servers) {
+        return -1;
+    }
     out = config_.apIpAddress.ToString();
-    return AppendDnsServers(4, "", "", out);
+    AppendDnsServers(*servers, "", "", out);
+    return 0;
 }
 
 int BridgeBase::GetV6DnsServerList(std::string& out) const {
@@ -501,7 +519,12 @@ int BridgeBase::GetV6DnsServerList(std::string& out) const {
             out += (out.empty() ? "[" : ",[") + server + "]";
         }
     }
-    return AppendDnsServers(6, "[", "]", out);
+    const auto servers = GetDnsServerList(6);
+    if (!servers) {
+        return -1;
+    }
+    AppendDnsServers(*servers, "[", "]", out);
+    return 0;
 }
 
 int BridgeBase::GetNextConfig(const BridgeConfig& config) {
@@ -734,6 +757,13 @@ int BridgeBase::StartNat(const char* verb) {
         return -1;
     }
     return 0;
+}
+
+bool BridgeBase::SetOwnGatewayInfo(const char* family, bool add) const {
+    const std::string type = GatewayType(family);
+    return add ? vornwireless::utils::SetGatewayInfo(name_, type, "NULL", "NULL", "bridge", -1,
+                                                     false)
+               : vornwireless::utils::DelGatewayInfo(name_, type, false);
 }
 
 int BridgeBase::SwitchTopology(WIFI_TOPOLOGY topology) {

@@ -3,6 +3,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -81,6 +82,8 @@ class BridgeBase {
     // with none at the end (dnsmasq refuses a trailing one).
     int GetV4DnsServerList(std::string& out) const;
     int GetV6DnsServerList(std::string& out) const;
+    // The appliance's resolvers of one family (4 or 6); none when they cannot be read (logged).
+    std::optional<std::vector<std::string>> GetDnsServerList(int family) const;
 
     virtual int CreateConfig() { return 0; }
     virtual int RemoveSlave();
@@ -120,6 +123,9 @@ class BridgeBase {
                              const std::vector<std::string>& keys) const;
     // Sets IPADDR/NETMASK, applies them with ifconfig and runs the script's NAT verb.
     int StartNat(const char* verb);
+    // Adds (or deletes) this bridge's own record, which offers no gateway, to the route module's
+    // list of family "v4" or "v6".
+    bool SetOwnGatewayInfo(const char* family, bool add) const;
 
     BridgeConfig config_;
 
@@ -143,6 +149,9 @@ class BridgeBase {
 // Fills the platform record: the bridge name always, the slave for types 2-4. 0 or -1 (logged).
 int ConvertToBridgeInfo(BRIDGE_INFO& info, const std::string& bridge, const std::string& slave,
                         BR_TYPE type);
+
+// The route module's list name of family "v4" or "v6".
+std::string GatewayType(const std::string& family);
 
 bool IsWiredIf(const std::string& name);
 bool IsWirelessIf(const std::string& name);

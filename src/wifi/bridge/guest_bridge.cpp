@@ -17,6 +17,22 @@ int GuestBridge::CreateConfig() {
                           config_.apIpAddress.ToString(), config_.apNetmask.ToString());
 }
 
+int GuestBridge::CreateGatewayInfo() {
+    if (!SetOwnGatewayInfo("v4", true) || !SetOwnGatewayInfo("v6", true)) {
+        VORN_LOG(LOG_ERR, "Failed to create gateway info.");
+        return -1;
+    }
+    return 0;
+}
+
+int GuestBridge::ResetGatewayInfo() {
+    if (!SetOwnGatewayInfo("v4", false) || !SetOwnGatewayInfo("v6", false)) {
+        VORN_LOG(LOG_ERR, "Failed to delete gateway info");
+        return -1;
+    }
+    return 0;
+}
+
 int GuestBridge::EnableNat() {
     return StartNat("start-guest-nat-rule");
 }

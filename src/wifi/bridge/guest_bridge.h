@@ -13,6 +13,8 @@ class GuestBridge : public BridgeBase {
 
     int CreateConfig() override;
     int RemoveSlave() override { return 0; }
+    int CreateGatewayInfo() override;
+    int ResetGatewayInfo() override;
     int EnableNat() override;
     int DisableNat() override;
     int EnableDhcp() override { return BridgeBase::EnableDhcp(); }

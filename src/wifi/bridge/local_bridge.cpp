@@ -16,6 +16,26 @@ int LocalBridge::CreateConfig() {
                           config_.apIpAddress.ToString(), config_.apNetmask.ToString());
 }
 
+int LocalBridge::CreateGatewayInfo() {
+    for (const char* family : {"v4", "v6"}) {
+        if (!SetOwnGatewayInfo(family, true)) {
+            VORN_LOG(LOG_ERR, "Failed to create %s gateway info of %s", family, GetNameC());
+            return -1;
+        }
+    }
+    return 0;
+}
+
+int LocalBridge::ResetGatewayInfo() {
+    for (const char* family : {"v4", "v6"}) {
+        if (!SetOwnGatewayInfo(family, false)) {
+            VORN_LOG(LOG_ERR, "Failed to delete %s gateway info of %s", family, GetNameC());
+            return -1;
+        }
+    }
+    return 0;
+}
+
 int LocalBridge::EnableNat() {
     return StartNat("start-nat");
 }

@@ -12,6 +12,8 @@ class LocalBridge : public BridgeBase {
     using BridgeBase::BridgeBase;
 
     int CreateConfig() override;
+    int CreateGatewayInfo() override;
+    int ResetGatewayInfo() override;
     int EnableNat() override;
     int DisableNat() override;
     int EnableDhcp() override { return BridgeBase::EnableDhcp(); }
