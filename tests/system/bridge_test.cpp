@@ -10,9 +10,9 @@
 #include "network/module/module_manager.h"
 #include "network/module/route_module.h"
 #include "platform/qlibc_file.h"
-#include "utils/dbus_client.h"
 #include "support/peer_namespace.h"
 #include "support/waiting.h"
+#include "utils/dbus_client.h"
 #include "wifi/bridge/bridge_base.h"
 #include "wifi/utils/utils.h"
 
@@ -21,11 +21,11 @@ namespace wifi {
 namespace {
 
 using ::testing::HasSubstr;
+using vorn::test::RunProgram;
+using vorn::test::WaitFor;
 using vornnetwork::network::module::MODULE_ROUTE;
 using vornnetwork::network::module::ModuleManager;
 using vornnetwork::network::module::RouteModule;
-using vorn::test::RunProgram;
-using vorn::test::WaitFor;
 
 constexpr const char* kLeaseFile = "/etc/dhcpd/lbr0.leases";
 

@@ -105,8 +105,8 @@ bool IsDhcpv6Type(const std::string& type) {
     return type == "ra-only" || type == "ra-stateless" || type == "stateful";
 }
 
-void AppendDnsServers(const std::vector<std::string>& servers, const char* open,
-                      const char* close, std::string& out) {
+void AppendDnsServers(const std::vector<std::string>& servers, const char* open, const char* close,
+                      std::string& out) {
     for (const auto& server : servers) {
         out += std::string(out.empty() ? "" : ",") + open + server + close;
     }
