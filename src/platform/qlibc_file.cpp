@@ -1,11 +1,14 @@
 #include "platform/qlibc_file.h"
 
+#include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <memory>
 #include <set>
 #include <string>
 #include <utility>
@@ -14,6 +17,7 @@
 #include "platform/qlibc_error.h"
 #include "platform/root_path.h"
 #include "platform/text_file.h"
+#include "utils/log.h"
 
 namespace {
 
@@ -255,6 +259,40 @@ int QLIBCFileEnumSection(const char* file, QLIBSZLIST** list) {
         }
     }
     return static_cast<int>(names.size());
+}
+
+int QLIBCFileEnumDir(const char* dir, const char* prefix, int max, QLIBSZLIST** names) {
+    if (dir == nullptr || names == nullptr || max < 0) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    const std::string start = prefix == nullptr ? "" : prefix;
+    const std::unique_ptr<DIR, int (*)(DIR*)> stream(opendir(RootPath(dir).c_str()), &closedir);
+    if (!stream) {
+        VORN_LOG(LOG_ERR, "Failed to read directory [%s] errno [%d]", dir, errno);
+        return Fail(errno == ENOENT ? QLIBC_ERR_NOT_FOUND : QLIBC_ERR_FILE_IO);
+    }
+    std::vector<std::string> found;
+    while (const dirent* entry = readdir(stream.get())) {
+        const std::string name = entry->d_name;
+        if (name != "." && name != ".." && name.compare(0, start.size(), start) == 0) {
+            found.push_back(name);
+        }
+    }
+    std::sort(found.begin(), found.end());
+    if (found.size() > static_cast<size_t>(max)) {
+        VORN_LOG(LOG_WARNING, "Directory [%s] has %zu entries [%s*], kept %d", dir, found.size(),
+                 start.c_str(), max);
+        found.resize(static_cast<size_t>(max));
+    }
+    if (Ensure(names, QLIBCSzListAlloc) == nullptr) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+    for (const auto& name : found) {
+        if (QLIBCSzListAdd(*names, name.c_str()) != 0) {
+            return Fail(QLIBC_ERR_NO_MEMORY);
+        }
+    }
+    return static_cast<int>(found.size());
 }
 
 int QLIBCFileGetSection(const char* file, const char* section, QLIBSZHASH** hash) {

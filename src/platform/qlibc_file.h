@@ -51,6 +51,11 @@ enum { QLIBC_FILE_QUOTE_VALUES = 1 };
 /* Appends the section names of a section file to *list (allocated when null), in file order,
  * each once. Returns the number of sections or -1. */
 int QLIBCFileEnumSection(const char* file, QLIBSZLIST** list);
+/* Appends to *names (allocated when null; the caller frees it with QLIBCSzListFree) the names of
+ * the entries of dir that begin with prefix (null: all), "." and ".." excepted, sorted, the first
+ * max of them (more are logged). Returns the number appended, or -1 when dir cannot be read
+ * (logged). */
+int QLIBCFileEnumDir(const char* dir, const char* prefix, int max, QLIBSZLIST** names);
 /* Adds the pairs of one section to *hash (allocated when null). Returns the number of keys of
  * the section (0 when it has none or is absent) or -1. */
 int QLIBCFileGetSection(const char* file, const char* section, QLIBSZHASH** hash);

@@ -148,4 +148,23 @@ TEST_F(QlibcFileTest, FileOperationsStayUnderTheRoot) {
     EXPECT_EQ(QLIBCSysUnlink("/tmp/moved"), -1);
 }
 
+TEST_F(QlibcFileTest, EnumDirListsMatchingNamesSortedUpToTheBound) {
+    for (const char* name :
+         {"vornwireless.wlan1", "vornwireless.pid", "vornwireless.ath0", "other"}) {
+        root_.WriteFile(std::string("/tmp/") + name, "");
+    }
+    QLIBSZLIST* names = nullptr;
+    ASSERT_EQ(QLIBCFileEnumDir("/tmp", "vornwireless", 2, &names), 2);
+    EXPECT_STREQ(QLIBCSzListGet(names, 0), "vornwireless.ath0");
+    EXPECT_STREQ(QLIBCSzListGet(names, 1), "vornwireless.pid");
+    QLIBCSzListFree(names);
+    names = nullptr;
+    EXPECT_EQ(QLIBCFileEnumDir("/tmp", "none", 8, &names), 0);
+    QLIBCSzListFree(names);
+    names = nullptr;
+    EXPECT_EQ(QLIBCFileEnumDir("/missing", "", 8, &names), -1);
+    EXPECT_EQ(log_.Lines().size(), 2u);  // the cut and the unreadable directory
+    QLIBCSzListFree(names);
+}
+
 }  // namespace

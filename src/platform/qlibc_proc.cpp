@@ -16,7 +16,9 @@
 
 #include "platform/qlibc_error.h"
 #include "platform/root_path.h"
+#include "platform/shell_command.h"
 #include "platform/spawn_setup.h"
+#include "utils/process.h"
 
 extern char** environ;
 
@@ -30,17 +32,27 @@ int Fail(int code) {
     return -1;
 }
 
-int WaitForExit(pid_t pid) {
-    int status = 0;
-    while (waitpid(pid, &status, 0) < 0) {
-        if (errno != EINTR) {
-            return Fail(QLIBC_ERR_EXEC);
+int ExitResult(int status) {
+    return WIFEXITED(status) && WEXITSTATUS(status) == 0 ? 0 : Fail(QLIBC_ERR_EXEC);
+}
+
+void ReapInBackground(pid_t pid) {
+    std::thread([pid] {
+        int status = 0;
+        while (waitpid(pid, &status, 0) < 0 && errno == EINTR) {
+        }
+    }).detach();
+}
+
+// The program and its argument words, for the log.
+std::string CommandText(const std::vector<char*>& argv) {
+    std::string text;
+    for (const char* word : argv) {
+        if (word != nullptr) {
+            text += (text.empty() ? "" : " ") + std::string(word);
         }
     }
-    if (WIFEXITED(status) && WEXITSTATUS(status) == 0) {
-        return 0;
-    }
-    return Fail(QLIBC_ERR_EXEC);
+    return text;
 }
 
 int Run(const char* program, int flags, const std::vector<const char*>& args) {
@@ -65,7 +77,10 @@ int Run(const char* program, int flags, const std::vector<const char*>& args) {
     if (flags & QLIBC_EXEC_NO_STDERR) {
         actions.Silence(STDERR_FILENO, O_WRONLY);
     }
-    SpawnAttributes attributes;
+    // A program waited for runs in a group of its own, so that the deadline kills all it started.
+    const bool wait = (flags & QLIBC_EXEC_WAIT) != 0;
+    const SpawnAttributes attributes(wait);
+    const auto deadline = vorn::platform::ProgramDeadline();
 
     pid_t pid = -1;
     int result = 0;
@@ -79,11 +94,15 @@ int Run(const char* program, int flags, const std::vector<const char*>& args) {
     if (result != 0) {
         return Fail(QLIBC_ERR_EXEC);
     }
-    if (flags & QLIBC_EXEC_WAIT) {
-        return WaitForExit(pid);
+    if (!wait) {
+        ReapInBackground(pid);
+        return 0;
     }
-    std::thread([pid] { WaitForExit(pid); }).detach();
-    return 0;
+    int status = 0;
+    if (!vorn::platform::WaitUntil(pid, CommandText(argv), deadline, status)) {
+        return Fail(QLIBC_ERR_EXEC);
+    }
+    return ExitResult(status);
 }
 
 }  // namespace
@@ -120,6 +139,10 @@ int QLIBCSystem(const char* commandLine) {
     }
     const std::string rooted = vorn::platform::RootShellCommand(commandLine);
     return Run("sh", QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN, {"-c", rooted.c_str()});
+}
+
+void QLIBCExecSetTimeout(int milliseconds) {
+    vorn::platform::SetProgramTimeout(milliseconds);
 }
 
 int QLIBCProcPidFileCreate(const char* path) {
@@ -176,6 +199,23 @@ int QLIBCProcSignalByPidFile(const char* path, int signal) {
         return Fail(QLIBC_ERR_NOT_FOUND);
     }
     return kill(pid, signal) == 0 ? 0 : Fail(QLIBC_ERR_INVALID_ARG);
+}
+
+int QLIBCProcKillByName(const char* name, int signal) {
+    std::vector<int> pids;
+    if (name == nullptr || name[0] == '\0' || !vornwireless::utils::FindProcesses(name, pids)) {
+        return Fail(QLIBC_ERR_INVALID_ARG);
+    }
+    int signalled = 0;
+    bool refused = false;
+    for (const int pid : pids) {
+        if (kill(pid, signal) == 0) {
+            ++signalled;
+        } else if (errno != ESRCH) {
+            refused = true;
+        }
+    }
+    return refused ? Fail(QLIBC_ERR_INVALID_ARG) : signalled;
 }
 
 }  // extern "C"

@@ -13,6 +13,11 @@ enum {
     QLIBC_EXEC_NO_STDIN = 0x10   /* standard input from /dev/null */
 };
 
+/* Every call below that waits for a program bounds the wait by a deadline (60 s unless
+ * QLIBCExecSetTimeout set another): a program still running then is killed with its whole
+ * process group (it starts in a group of its own), the kill is logged naming the program, and
+ * the call fails. */
+
 /* Runs program with the argument words that follow flags, ending in a null pointer. An absolute
  * program is resolved under the root prefix; a bare name is searched on PATH. The program runs
  * through posix_spawn, never a shell, with argv[0] the program as given. Arguments are passed as
@@ -27,6 +32,9 @@ int QLIBCExec(const char* program, const char* arg1, const char* arg2, const cha
 /* Runs a shell command line (its absolute programs resolved under the root) through /bin/sh and
  * waits. 0 on exit status 0, else -1. */
 int QLIBCSystem(const char* commandLine);
+/* Sets the deadline of every program run from now on, process-wide; 0 or less restores the
+ * default of 60000 ms. */
+void QLIBCExecSetTimeout(int milliseconds);
 
 /* Writes the calling process's id and a line end to path (replaced atomically). 0 or -1. */
 int QLIBCProcPidFileCreate(const char* path);
@@ -37,6 +45,11 @@ int QLIBCReadPidFile(const char* path);
 int QLIBCProcAlive(int pid);
 /* Sends signal to the process named in the pid file. 0 or -1. */
 int QLIBCProcSignalByPidFile(const char* path, int signal);
+/* Sends signal to every live process of this host running the program of exactly that file name
+ * (the name in /proc/PID/comm, and for names of 15 characters or more the file name of argv[0]).
+ * The number of processes signalled (0 when none), -1 on a bad name, an unreadable /proc or a
+ * refused signal. */
+int QLIBCProcKillByName(const char* name, int signal);
 
 #ifdef __cplusplus
 }

@@ -1,9 +1,15 @@
 #include "platform/qlibc_proc.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 #include <signal.h>
+#include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include <chrono>
+#include <fstream>
+
+#include "platform/shell_command.h"
 
 #include "support/sim_root.h"
 #include "support/waiting.h"
@@ -12,6 +18,26 @@ namespace {
 
 using Calls = std::vector<std::string>;
 using QlibcProcTest = vorn::test::RootTest;
+using ::testing::Contains;
+using ::testing::HasSubstr;
+
+extern "C" char** environ;
+
+// Ended and reaped, or a zombie no one has reaped yet: either way no longer running.
+bool IsGone(const std::string& pid) {
+    std::ifstream stat("/proc/" + pid + "/stat");
+    std::string line;
+    std::getline(stat, line);
+    const std::size_t close = line.rfind(')');
+    return line.empty() || (close != std::string::npos && line.compare(close, 3, ") Z") == 0);
+}
+
+pid_t Spawn(const std::string& program, const char* arg) {
+    char* const argv[] = {const_cast<char*>(program.c_str()), const_cast<char*>(arg), nullptr};
+    pid_t pid = -1;
+    EXPECT_EQ(posix_spawn(&pid, program.c_str(), nullptr, nullptr, argv, environ), 0);
+    return pid;
+}
 
 TEST_F(QlibcProcTest, ProgramsRunUnderTheRootWithTheirArgumentWords) {
     root_.Scenario("ip", "when route add default via 10.0.0.9 *\nstderr Error: Nexthop\nexit 2\n");
@@ -39,6 +65,47 @@ TEST_F(QlibcProcTest, ProgramsRunUnderTheRootWithTheirArgumentWords) {
               0);  // in the background
     EXPECT_TRUE(vorn::test::WaitFor([this] { return !root_.Calls().empty(); }));
     EXPECT_EQ(root_.Calls(), (Calls{"/sbin/ifconfig wlan0 up"}));
+}
+
+TEST_F(QlibcProcTest, AProgramPastTheDeadlineIsKilledWithAllItStarted) {
+    QLIBCExecSetTimeout(300);
+    const std::string pidFile = root_.Path("/tmp/grandchild.pid");
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(QLIBCExecl("/bin/sh", QLIBC_EXEC_WAIT, "-c",
+                         ("sleep 30 & echo $! > " + pidFile + "; wait").c_str(),
+                         static_cast<char*>(nullptr)),
+              -1);
+    EXPECT_EQ(QLIBCSystem("/bin/sleep 30"), -1);
+    std::vector<std::string> lines;
+    EXPECT_EQ(vorn::platform::ReadShellCommandLines("echo early; /bin/sleep 30", lines), -1);
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(20));
+    std::string grandchild;
+    std::ifstream(pidFile) >> grandchild;
+    ASSERT_FALSE(grandchild.empty());
+    EXPECT_TRUE(vorn::test::WaitFor([&] { return IsGone(grandchild); }));
+    EXPECT_THAT(log_.Lines(), Contains(HasSubstr("Killed [/bin/sh -c sleep 30 &")));
+    EXPECT_THAT(log_.Lines(), Contains(HasSubstr("Killed [echo early; /bin/sleep 30]")));
+    QLIBCExecSetTimeout(0);
+    EXPECT_EQ(QLIBCSystem("/bin/sleep 0.5"), 0);
+}
+
+TEST_F(QlibcProcTest, KillByNameMatchesTheWholeProgramName) {
+    // Longer than the 15 characters the kernel keeps, and unique to this run.
+    const std::string name = "vorn-kill-test-" + std::to_string(getpid());
+    const std::string program = root_.Dir() + "/" + name;
+    ASSERT_EQ(symlink("/bin/sleep", program.c_str()), 0);
+    const pid_t first = Spawn(program, "30");
+    const pid_t second = Spawn(program, "30");
+    EXPECT_EQ(QLIBCProcKillByName(name.substr(0, 15).c_str(), SIGTERM), 0);
+    EXPECT_EQ(QLIBCProcKillByName((name + "x").c_str(), SIGTERM), 0);
+    EXPECT_EQ(QLIBCProcKillByName(name.c_str(), SIGTERM), 2);
+    for (const pid_t pid : {first, second}) {
+        int status = 0;
+        ASSERT_EQ(waitpid(pid, &status, 0), pid);
+        EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == SIGTERM);
+    }
+    EXPECT_EQ(QLIBCProcKillByName(name.c_str(), SIGTERM), 0);
+    EXPECT_EQ(QLIBCProcKillByName("", SIGTERM), -1);
 }
 
 TEST_F(QlibcProcTest, PidFiles) {

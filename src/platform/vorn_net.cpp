@@ -30,6 +30,7 @@ namespace {
 
 using vornwireless::utils::IsValidInterfaceName;
 
+const char kIfcfgDir[] = "/etc/sysconfig/network-scripts";
 const char kIfcfgPrefix[] = "/etc/sysconfig/network-scripts/ifcfg-";
 const char kNetworkFile[] = "/etc/sysconfig/network";
 const char kEventLog[] = "/var/log/vorn_event.log";
@@ -46,6 +47,7 @@ constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO
 constexpr size_t kMaxRouteLines = 1024;
 constexpr size_t kMaxRouteLineLength = 1024;
 constexpr int kMaxEventTexts = 16;
+constexpr int kMaxInterfaceFiles = 256;
 constexpr size_t kMaxEventTextLength = 256;
 
 struct HashDeleter {
@@ -180,6 +182,26 @@ bool AddResolverLines(const char* source, std::vector<std::string>& lines) {
         if (!line.empty() && std::find(lines.begin(), lines.end(), line) == lines.end()) {
             lines.push_back(line);
         }
+    }
+    return true;
+}
+
+// Starts or stops the PPPoE relay of one interface as its ifcfg file says. False on failure.
+bool ApplyPPPoERelay(const std::string& ifname) {
+    char value[16] = {};
+    const int found =
+        QLIBCFileGetKeyValue(IfcfgPath(ifname).c_str(), "PPPOE_RELAY", value, sizeof(value), 0);
+    if (found < 0) {
+        VORN_LOG(LOG_ERR, "Failed to read PPPOE_RELAY of [%s]", ifname.c_str());
+        return false;
+    }
+    if (found == 0) {
+        return true;
+    }
+    const char* action = strcmp(value, "yes") == 0 ? "start-pppoe-relay" : "stop-pppoe-relay";
+    if (QLIBCExecl("/etc/rc.network", kExecFlags, action, ifname.c_str(), nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to %s [%s]", action, ifname.c_str());
+        return false;
     }
     return true;
 }
@@ -502,6 +524,30 @@ int VORNNetIPv6ConfSet(int mode, const char* ifname, int reserved1, int reserved
             return -1;
         }
         return QLIBCExecl("/etc/rc.network", kExecFlags, "ipv6-restart", ifname, nullptr);
+    } catch (const std::exception&) {
+        return Fail(QLIBC_ERR_NO_MEMORY);
+    }
+}
+
+int VORNNetApplyPPPoERelayConfigAll(void) {
+    try {
+        QLIBSZLIST* raw = nullptr;
+        const int count = QLIBCFileEnumDir(kIfcfgDir, "ifcfg-", kMaxInterfaceFiles, &raw);
+        const List files(raw);
+        if (count < 0) {
+            return -1;
+        }
+        bool applied = true;
+        for (int i = 0; i < count; ++i) {
+            const std::string ifname = QLIBCSzListGet(files.get(), i) + strlen("ifcfg-");
+            if (!IsValidInterfaceName(ifname)) {
+                VORN_LOG(LOG_WARNING, "Skipped [%s/ifcfg-%s]: not an interface name", kIfcfgDir,
+                         ifname.c_str());
+                continue;
+            }
+            applied = ApplyPPPoERelay(ifname) && applied;
+        }
+        return applied ? 0 : Fail(QLIBC_ERR_EXEC);
     } catch (const std::exception&) {
         return Fail(QLIBC_ERR_NO_MEMORY);
     }

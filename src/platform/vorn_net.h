@@ -85,6 +85,13 @@ int VORNNetIPv6ConfGet(const char* ifname, VORN_NET_IPV6_CONFIG* config);
  * write or a failed restart. */
 int VORNNetIPv6ConfSet(int mode, const char* ifname, int reserved1, int reserved2, int reserved3);
 
+/* Applies the PPPoE relay setting of every interface that has an
+ * "/etc/sysconfig/network-scripts/ifcfg-IF" file: "/etc/rc.network" "start-pppoe-relay" IF when
+ * it holds PPPOE_RELAY="yes", "stop-pppoe-relay" IF when it holds the key with another value,
+ * nothing without the key. A file whose name is not an interface name is logged and skipped.
+ * Every interface is tried; 0, or -1 when a file could not be read or a call failed (logged). */
+int VORNNetApplyPPPoERelayConfigAll(void);
+
 #ifdef __cplusplus
 }
 #endif

@@ -114,4 +114,17 @@ TEST_F(VornNetTest, ResolverFileJoinsBothFamiliesOnce) {
     EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"), joined);
 }
 
+TEST_F(VornNetTest, PPPoERelayFollowsEachInterfaceFileAndSkipsBadNames) {
+    root_.WriteFile(kIfcfg + "eth0", "DEVICE=eth0\nPPPOE_RELAY=\"yes\"\n");
+    root_.WriteFile(kIfcfg + "eth1", "DEVICE=eth1\nPPPOE_RELAY=no\n");
+    root_.WriteFile(kIfcfg + "eth2", "DEVICE=eth2\n");
+    root_.WriteFile(kIfcfg + "x;reboot", "PPPOE_RELAY=yes\n");
+    root_.Scenario("rc.network", "when start-pppoe-relay *\nexit 1\n");
+    EXPECT_EQ(VORNNetApplyPPPoERelayConfigAll(), -1);
+    EXPECT_THAT(root_.Calls(), ElementsAre("/etc/rc.network start-pppoe-relay eth0",
+                                           "/etc/rc.network stop-pppoe-relay eth1"));
+    root_.Scenario("rc.network", "");
+    EXPECT_EQ(VORNNetApplyPPPoERelayConfigAll(), 0);
+}
+
 }  // namespace

@@ -3,6 +3,7 @@
 #include <dirent.h>
 
 #include <cctype>
+#include <cstdlib>
 #include <fstream>
 #include <memory>
 #include <string>
@@ -57,19 +58,25 @@ bool IsPid(const char* text) {
 }  // namespace
 
 bool IsProcessAlive(const std::string& name) {
-    if (name.empty() || name.size() > kMaxNameLength || name.find('/') != std::string::npos) {
-        return false;
-    }
+    std::vector<int> pids;
+    return FindProcesses(name, pids) && !pids.empty();
+}
+
+bool FindProcesses(const std::string& name, std::vector<int>& pids) {
+    pids.clear();
     const std::unique_ptr<DIR, int (*)(DIR*)> proc(opendir("/proc"), &closedir);
     if (!proc) {
         return false;
     }
+    if (name.empty() || name.size() > kMaxNameLength || name.find('/') != std::string::npos) {
+        return true;
+    }
     while (const dirent* entry = readdir(proc.get())) {
         if (IsPid(entry->d_name) && RunsProgram(entry->d_name, name)) {
-            return true;
+            pids.push_back(std::atoi(entry->d_name));
         }
     }
-    return false;
+    return true;
 }
 
 }  // namespace utils
