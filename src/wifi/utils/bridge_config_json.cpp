@@ -1,7 +1,10 @@
 #include "wifi/utils/bridge_config_json.h"
 
+#include <algorithm>
+
 #include "utils/config.h"
 #include "utils/log.h"
+#include "wifi/adapter/adapter.h"
 
 namespace vornwireless {
 namespace wifi {
@@ -58,8 +61,12 @@ Json::Value GetJsonValue(const BridgeBase* bridge) {
     for (const auto& slave : config.slaveList) {
         json["slave_list"].append(slave);
     }
-    // The adapters of the slaves report their status once adapters are managed.
-    json["status"] = "disabled";
+    const bool enabled =
+        std::any_of(config.slaveList.begin(), config.slaveList.end(), [](const std::string& s) {
+            const Adapter* adapter = Adapter::GetAdapter(s);
+            return adapter != nullptr && adapter->GetStatus() == WIFI_STATUS_ENABLED;
+        });
+    json["status"] = enabled ? "enabled" : "disabled";
     json["ifname"] = bridge->GetName();
     json["bridge_type"] = BridgeType(bridge->GetName());
     json["ap_ip_address"] = config.apIpAddress.ToString();

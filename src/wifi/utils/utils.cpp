@@ -1,18 +1,23 @@
 #include "wifi/utils/utils.h"
 
+#include <net/if_arp.h>
 #include <strings.h>
 
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
+#include <sstream>
 #include <vector>
 
+#include "network/module/arpscanner.h"
 #include "platform/qlib_crypt.h"
 #include "platform/qlibc_container.h"
 #include "platform/qlibc_file.h"
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "platform/shell_command.h"
+#include "platform/text_file.h"
+#include "platform/vorn_ipv6.h"
 #include "utils/interface_name.h"
 #include "utils/log.h"
 #include "utils/process.h"
@@ -28,6 +33,7 @@ constexpr const char* kFactoryFile = "/etc.defaults/vorninfo.conf";
 constexpr const char* kTopologyKey = "net_topology";
 constexpr const char* kSupportKey = "support_net_topology";
 constexpr const char* kRltModuleDir = "/usr/vorn/lib/modules/";
+constexpr const char* kArpTable = "/proc/net/arp";
 constexpr int kValueSize = 256;
 constexpr std::string::size_type kMaxIndexDigits = 4;
 constexpr std::size_t kMaxModeLines = 16;
@@ -61,6 +67,19 @@ int IndexAfter(const std::string& prefix, const std::string& name) {
         return -1;
     }
     return std::atoi(digits.c_str());
+}
+
+// A "yes"/"no" key of the settings file, written "key=\"value\"".
+int SetSettingsFlag(const char* key, bool yes) {
+    QLIBSZHASH* pairs = QLIBCSzHashAlloc(1);
+    const bool ok = pairs != nullptr && QLIBCSzHashSetValue(pairs, key, yes ? "yes" : "no") == 0 &&
+                    QLIBCFileSetKeys(kSettingsFile, pairs, nullptr, QLIBC_FILE_QUOTE_VALUES) == 0;
+    QLIBCSzHashFree(pairs);
+    if (!ok) {
+        VORN_LOG(LOG_ERR, "Failed to set key [%s] in file [%s]", key, kSettingsFile);
+        return -1;
+    }
+    return 0;
 }
 
 bool IsSettingYes(const char* key) {
@@ -223,11 +242,11 @@ int GetTopologyString(std::string& out) {
 }
 
 int SetSupportNetTopology(bool support) {
-    if (QLIBCFileSetKeyValue(kSettingsFile, kSupportKey, support ? "yes" : "no") != 0) {
-        VORN_LOG(LOG_ERR, "Failed to set key [%s] in file [%s]", kSupportKey, kSettingsFile);
-        return -1;
-    }
-    return 0;
+    return SetSettingsFlag(kSupportKey, support);
+}
+
+int SetHasWifiDongle(bool has) {
+    return SetSettingsFlag("has_wifi_dongle", has);
 }
 
 bool IsSupportTopology() {
@@ -325,6 +344,40 @@ int RemoveRLTKernelModule(const std::string& module) {
     }
     const std::string name = module.substr(0, module.size() - 3);
     return QLIBCExecl("/sbin/rmmod", QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN, name.c_str(), nullptr);
+}
+
+bool IsNetActivate(const std::string& ifname) {
+    return VORNNetIfIsUp(ifname.c_str()) == 1;
+}
+
+int GetArpInfoByMAC(const vornwireless::utils::MacAddress& mac,
+                    vornwireless::utils::IPAddress& ip) {
+    std::string text;
+    if (!vorn::platform::ReadTextFile(vorn::platform::RootPath(kArpTable), text)) {
+        VORN_LOG(LOG_ERR, "Failed to read [%s]", kArpTable);
+        return -1;
+    }
+    // "IP address  HW type  Flags  HW address  Mask  Device"
+    for (const std::string& line : vorn::platform::SplitLines(text)) {
+        std::istringstream words(line);
+        std::string address, type, flags, hardware;
+        if (!(words >> address >> type >> flags >> hardware) ||
+            strcasecmp(hardware.c_str(), mac.ToCString()) != 0 ||
+            (std::strtoul(flags.c_str(), nullptr, 16) & ATF_COM) == 0) {
+            continue;
+        }
+        ip = vornwireless::utils::IPAddress(address);
+        if (!ip.IsEmpty()) {
+            return 0;
+        }
+    }
+    return -1;
+}
+
+int GetDHCPInfoByMAC(const vornwireless::utils::MacAddress& mac, std::string& hostname) {
+    hostname.clear();
+    return vornnetwork::network::module::ArpScanner::Inst()->GetDHCPInfoByMAC(mac.ToString(),
+                                                                              hostname);
 }
 
 }  // namespace utils

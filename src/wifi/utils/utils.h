@@ -3,6 +3,8 @@
 
 #include <string>
 
+#include "utils/ip_address.h"
+#include "utils/mac_address.h"
 #include "wifi/settings/enum.h"
 
 // The small wifi utilities: interface facts, the appliance model, the password cipher and the
@@ -10,6 +12,14 @@
 namespace vornwireless {
 namespace wifi {
 namespace utils {
+
+// A station connected to one of the appliance's access points.
+struct ConnectionInfo {
+    vornwireless::utils::MacAddress mac;
+    vornwireless::utils::IPAddress ip;
+    std::string hostname;
+    int connected_time = 0;  // seconds
+};
 
 // The MAC address in "/sys/class/net/IF/address", or "" (logged) when it cannot be read.
 std::string GetBssid(const std::string& ifname);
@@ -52,6 +62,7 @@ int WriteTopology(WIFI_TOPOLOGY topology);
 int GetTopologyString(std::string& out);
 // Key "support_net_topology" ("yes"/"no") and "has_wifi_dongle" of "/etc/vorninfo.conf".
 int SetSupportNetTopology(bool support);
+int SetHasWifiDongle(bool has);
 bool IsSupportTopology();
 bool HasWifiDongle();
 
@@ -71,6 +82,15 @@ int GetSignalStrength(const std::string& ifname);
 // (MODULE without ".ko"). 0 or -1.
 int InsertRLTKernelModule(const std::string& module = "rlt_wifi.ko");
 int RemoveRLTKernelModule(const std::string& module = "rlt_wifi.ko");
+
+// Whether the interface is up and running (the platform's link check).
+bool IsNetActivate(const std::string& ifname);
+// A station's address in the kernel's ARP table ("/proc/net/arp", complete entries only; MAC
+// case ignored). 0, or -1 when it has none.
+int GetArpInfoByMAC(const vornwireless::utils::MacAddress& mac, vornwireless::utils::IPAddress& ip);
+// The host name of the station's lease in the DHCP server's lease file, read as the LAN device
+// list reads it; "" when it has none. 0, or -1 when the file cannot be read.
+int GetDHCPInfoByMAC(const vornwireless::utils::MacAddress& mac, std::string& hostname);
 
 }  // namespace utils
 }  // namespace wifi

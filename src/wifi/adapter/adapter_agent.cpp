@@ -1,0 +1,78 @@
+#include "wifi/adapter/adapter_agent.h"
+
+#include "utils/log.h"
+#include "wifi/adapter/adapter.h"
+#include "wifi/adapter/adapter_agent_hostapd_bridge.h"
+#include "wifi/adapter/adapter_agent_hostapd_router.h"
+#include "wifi/settings/enum_map.h"
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+const char* KindName(AdapterAgent::Kind kind) {
+    switch (kind) {
+        case AdapterAgent::Kind::kHostapdBridge:
+            return "hostapd bridge";
+        case AdapterAgent::Kind::kHostapdRouter:
+            return "hostapd router";
+        case AdapterAgent::Kind::kRLTBridge:
+            return "rlt bridge";
+        case AdapterAgent::Kind::kRLTRouter:
+            return "rlt router";
+        case AdapterAgent::Kind::kClient:
+            return "client";
+        case AdapterAgent::Kind::kClientRLT:
+            return "rlt client";
+        case AdapterAgent::Kind::kNone:
+            break;
+    }
+    return "none";
+}
+
+}  // namespace
+
+AdapterAgent::Kind AdapterAgent::Choose(const AdapterConfig& config, WIFI_TOPOLOGY topology) {
+    if (config.driver != WIFI_DRIVER_NL80211) {
+        VORN_LOG(LOG_ERR, "Not supported driver(%d)", static_cast<int>(config.driver));
+        return Kind::kNone;
+    }
+    const bool rlt = utils::IsKiteBBuiltInWlan(config.name);
+    switch (topology) {
+        case WIFI_TOPOLOGY_ROUTER:
+            return rlt ? Kind::kRLTRouter : Kind::kHostapdRouter;
+        case WIFI_TOPOLOGY_CLIENT:
+            return rlt ? Kind::kClientRLT : Kind::kClient;
+        case WIFI_TOPOLOGY_BRIDGE:
+            return rlt ? Kind::kRLTBridge : Kind::kHostapdBridge;
+        default:
+            break;
+    }
+    VORN_LOG(LOG_ERR, rlt ? "Failed to create rlt agent" : "Failed to create hostapd agent");
+    return Kind::kNone;
+}
+
+AdapterAgent* AdapterAgent::Create(const AdapterConfig& config) {
+    const Kind kind = Choose(config, Adapter::GetTopology());
+    switch (kind) {
+        case Kind::kHostapdRouter:
+            return new AdapterAgentHostapdRouter(config.name);
+        case Kind::kHostapdBridge:
+            return new AdapterAgentHostapdBridge(config.name);
+        case Kind::kNone:
+            return nullptr;
+        default:
+            break;
+    }
+    // The RLT and station agents are not part of this build yet.
+    VORN_LOG(LOG_ERR, "No %s agent for [%s] in this build", KindName(kind), config.name.c_str());
+    return nullptr;
+}
+
+int AdapterAgent::Delete(const AdapterAgent* agent) {
+    delete agent;
+    return 0;
+}
+
+}  // namespace wifi
+}  // namespace vornwireless

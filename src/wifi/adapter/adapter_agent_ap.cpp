@@ -1,0 +1,149 @@
+#include "wifi/adapter/adapter_agent_ap.h"
+
+#include <sys/stat.h>
+
+#include <fstream>
+#include <sstream>
+
+#include "platform/qlibc_proc.h"
+#include "platform/root_path.h"
+#include "platform/text_file.h"
+#include "platform/vorn_schedule.h"
+#include "utils/interface_name.h"
+#include "utils/log.h"
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+constexpr const char* kGuestScript = "/usr/vorn/etc/iptables_guest_net.sh";
+constexpr const char* kTool = "/usr/vorn/bin/vornwireless";
+constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
+
+// The interface name reaches command lines and the crontab line: the kernel allows "$", "`",
+// ";" and "%" in names.
+bool CheckName(const std::string& ifname) {
+    if (!vornwireless::utils::IsValidInterfaceName(ifname)) {
+        VORN_LOG(LOG_ERR, "Refused interface name [%s]", ifname.c_str());
+        return false;
+    }
+    return true;
+}
+
+int RunGuestScript(const char* action, const char* what, const std::string& ifname) {
+    return QLIBCExecl(kGuestScript, kExecFlags, action, what,
+                      ifname.empty() ? nullptr : ifname.c_str(), nullptr);
+}
+
+// A fresh file renamed over the path, so a file or link planted there is replaced, never written
+// through.
+bool CopyTool(const std::string& target) {
+    std::ifstream in(vorn::platform::RootPath(kTool), std::ios::binary);
+    std::ostringstream content;
+    content << in.rdbuf();
+    const std::string real = vorn::platform::RootPath(target);
+    return in.is_open() && !content.str().empty() &&
+           vorn::platform::WriteFileAtomically(real, content.str()) &&
+           chmod(real.c_str(), 0755) == 0;
+}
+
+}  // namespace
+
+int AdapterAgentAP::Reload(const AdapterConfig& config, RELOAD_STATUS status) {
+    if (status.restart) {
+        DisableAP(config);
+        EnableAP(config);
+    }
+    if (status.tx_power) {
+        SetTXPower(config);
+    }
+    if (status.guest_rule) {
+        DisableRuleGuest(config);
+        EnableRuleGuest(config);
+    }
+    if (status.schedule || status.guest_schedule) {
+        SetSchedule(config);
+    }
+    return 0;
+}
+
+int AdapterAgentAP::EnableRuleGuest(const AdapterConfig& config) {
+    if (!config.guest_support || !config.enabled || !config.guest_enabled) {
+        return 0;
+    }
+    if (!CheckName(config.name)) {
+        return -1;
+    }
+    if (RunGuestScript("ins", "mod", "") != 0) {
+        VORN_LOG(LOG_ERR, "Failed to insmod guest net access module");
+        return -1;
+    }
+    if (RunGuestScript("ins", "all", config.name) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to start guest net access rule");
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentAP::DisableRuleGuest(const AdapterConfig& config) {
+    if (!config.guest_support) {
+        return 0;
+    }
+    if (!CheckName(config.name)) {
+        return -1;
+    }
+    if (RunGuestScript("del", "all", config.name) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to stop guest net access rule");
+        return -1;
+    }
+    if (RunGuestScript("del", "mod", "") != 0) {
+        VORN_LOG(LOG_ERR, "Failed to remod guest net access module");
+        return -1;
+    }
+    return 0;
+}
+
+std::string AdapterAgentAP::ScheduleTool(const std::string& ifname) {
+    return "/tmp/vornwireless." + ifname;
+}
+
+std::string AdapterAgentAP::ScheduleCommand(const std::string& ifname) {
+    return ScheduleTool(ifname) + " --exec-schedule " + ifname;
+}
+
+int AdapterAgentAP::SetSchedule(const AdapterConfig& config) {
+    if (!config.schedule_enabled && !(config.guest_support && config.guest_schedule_enabled)) {
+        return RemoveSchedule(config);
+    }
+    if (!CheckName(config.name)) {
+        return -1;
+    }
+    if (VORNScheduleSet(ScheduleCommand(config.name).c_str(), 127, 0, 23, 0) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to enable wifi scheduler\n");
+        return -1;
+    }
+    if (!CopyTool(ScheduleTool(config.name))) {
+        VORN_LOG(LOG_ERR, "Failed to copy %s to /tmp/", kTool);
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentAP::RemoveSchedule(const AdapterConfig& config) {
+    if (!CheckName(config.name)) {
+        return -1;
+    }
+    if (VORNScheduleRemove(ScheduleCommand(config.name).c_str()) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to disable wifi scheduler\n");
+        return -1;
+    }
+    if (QLIBCExecl("/bin/rm", kExecFlags, "-f",
+                   vorn::platform::RootPath(ScheduleTool(config.name)).c_str(), nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to remove %s", "/tmp/vornwireless");
+        return -1;
+    }
+    return 0;
+}
+
+}  // namespace wifi
+}  // namespace vornwireless
