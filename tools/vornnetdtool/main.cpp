@@ -408,11 +408,12 @@ void Usage(FILE* out) {
                  "else the method's error number (1 when it has none), 2 for a usage error.\n\n"
                  "Commands:\n");
     for (const Command& command : Commands()) {
-        std::fprintf(out, "  %s %-16s %s\n", command.option, command.operand, command.help);
+        const std::string words = std::string(command.option) + " " + command.operand;
+        std::fprintf(out, "  %-34s %s\n", words.c_str(), command.help);
     }
     std::fprintf(
         out,
-        "  --ready                           exit 0 when vornnetd runs and owns its name\n\n"
+        "  --ready                            exit 0 when vornnetd runs and owns its name\n\n"
         "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
         "Example: vornnetdtool --add-gateway "
         "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n\n"
