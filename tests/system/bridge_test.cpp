@@ -13,6 +13,7 @@
 #include "support/peer_namespace.h"
 #include "support/waiting.h"
 #include "utils/dbus_client.h"
+#include "wifi/adapter/adapter.h"
 #include "wifi/bridge/bridge_base.h"
 #include "wifi/utils/utils.h"
 
@@ -103,6 +104,8 @@ TEST_F(BridgeSystemTest, RouterAndBridgeTopologiesRunWithRealBridgesAndDnsmasq) 
     ASSERT_TRUE(vornwireless::utils::SetGatewayInfo("eth0", "GTYPE_V4", "10.9.0.1", "10.9.0.1",
                                                     "ethernet", 0, false));
     ASSERT_EQ(utils::WriteTopology(WIFI_TOPOLOGY_ROUTER), 0);
+    Adapter::SwitchTopology(WIFI_TOPOLOGY_ROUTER);
+    Adapter::SetDriverSettleTime(std::chrono::milliseconds(0));
     ASSERT_EQ(BridgeBase::Initialize(), 0) << ::testing::PrintToString(log_.Lines());
     EXPECT_EQ(GatewaysV4(), "eth0:10.9.0.1 lbr0 gbr0");
     EXPECT_TRUE(IsSlave("lbr0", "wlan0"));
@@ -145,15 +148,11 @@ TEST_F(BridgeSystemTest, RouterAndBridgeTopologiesRunWithRealBridgesAndDnsmasq) 
         return root_->ReadFile(kLeaseFile).find(" 192.168.100.") != std::string::npos;
     })) << dnsmasq.Stderr();
 
-    // Down to the bridge topology: the ports leave lbr0, br0 takes eth0 and its address.
-    ASSERT_EQ(BridgeBase::DisableAll(), 0);
-    ASSERT_EQ(BridgeBase::DisableTopologyAll(), 0);
+    // The whole switch to the bridge topology: the ports leave lbr0, br0 takes eth0 and its
+    // address.
+    ASSERT_EQ(Adapter::SwitchNetTopology(WIFI_TOPOLOGY_BRIDGE), 0)
+        << ::testing::PrintToString(log_.Lines());
     EXPECT_FALSE(IsSlave("lbr0", "wlan0"));
-    EXPECT_EQ(GatewaysV4(), "eth0:10.9.0.1");
-    ASSERT_EQ(utils::WriteTopology(WIFI_TOPOLOGY_BRIDGE), 0);
-    ASSERT_EQ(BridgeBase::SwitchTopology(WIFI_TOPOLOGY_BRIDGE), 0);
-    ASSERT_EQ(BridgeBase::EnableTopologyAll(), 0) << ::testing::PrintToString(log_.Lines());
-    ASSERT_EQ(BridgeBase::EnableAll(), 0);
     EXPECT_TRUE(IsSlave("br0", "eth0"));
     EXPECT_TRUE(IsSlave("br0", "wlan0"));
     EXPECT_THAT(vorn::test::Shell("/sbin/ip -4 -o addr show dev br0"), HasSubstr("10.9.0.2/24"));

@@ -9,6 +9,8 @@
 
 #include "support/sim_root.h"
 #include "wifi/adapter/adapter_agent_ap.h"
+#include "wifi/bridge/bridge_base.h"
+#include "wifi/utils/bridge_config_json.h"
 
 namespace vornwireless {
 namespace wifi {
@@ -162,6 +164,12 @@ TEST_F(AdapterTest, ApplyReloadsByFlagsAndTheScheduleSwitchesByTheHour) {
     EXPECT_EQ(Adapter::SwitchOnOff(), 0);
     EXPECT_THAT(calls_, ElementsAre("Enable(on)", "Disable(off)"));
     EXPECT_FALSE(adapter.GetConfig().enabled);
+    // A bridge is on while one of its slaves' radios is.
+    ASSERT_EQ(BridgeBase::SwitchTopology(WIFI_TOPOLOGY_ROUTER), 0);
+    EXPECT_EQ(utils::GetJsonValue(BridgeBase::GetBridge("lbr0"))["status"], "disabled");
+    agent_->status = WIFI_STATUS_ENABLED;
+    EXPECT_EQ(utils::GetJsonValue(BridgeBase::GetBridge("lbr0"))["status"], "enabled");
+    BridgeBase::ClearBridgeList();
     Adapter::SwitchTopology(WIFI_TOPOLOGY_CLIENT);
     EXPECT_EQ(adapter.ExecSchedule(At(0, 0)), -1);
 }
