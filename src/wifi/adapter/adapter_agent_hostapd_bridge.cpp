@@ -1,0 +1,1 @@
+#include "wifi/adapter/adapter_agent_hostapd_bridge.h"
