@@ -22,6 +22,7 @@
 #include "platform/plugin_timeout.h"
 #include "platform/qlibc_error.h"
 #include "platform/root_path.h"
+#include "platform/shell_command.h"
 #include "platform/spawn_setup.h"
 #include "utils/log.h"
 
@@ -38,9 +39,6 @@ namespace platform {
 namespace {
 
 constexpr int kDefaultTimeoutMs = QLIB_PLUGIN_TIMEOUT_SECONDS * 1000;
-// A hook script usually ends within milliseconds: poll often at first, then back off.
-constexpr auto kFirstPoll = std::chrono::microseconds(200);
-constexpr auto kLongestPoll = std::chrono::microseconds(10000);
 
 std::atomic<int> timeoutMs{kDefaultTimeoutMs};
 
@@ -151,33 +149,6 @@ class ScriptSpawn {
     vorn::platform::SpawnActions actions_;
 };
 
-enum class Ending { kExited, kKilled, kLost };
-
-// Waits up to the bound; past it the script's whole group is killed.
-Ending WaitBounded(pid_t pid, int& status) {
-    const auto deadline =
-        std::chrono::steady_clock::now() + std::chrono::milliseconds(timeoutMs.load());
-    std::chrono::microseconds poll = kFirstPoll;
-    for (;;) {
-        const pid_t done = waitpid(pid, &status, WNOHANG);
-        if (done == pid) {
-            return Ending::kExited;
-        }
-        if (done < 0 && errno != EINTR) {
-            return Ending::kLost;
-        }
-        if (std::chrono::steady_clock::now() >= deadline) {
-            // Still unreaped, so the group id cannot have been reused.
-            kill(-pid, SIGKILL);
-            while (waitpid(pid, &status, 0) < 0 && errno == EINTR) {
-            }
-            return Ending::kKilled;
-        }
-        std::this_thread::sleep_for(poll);
-        poll = std::min(poll * 2, kLongestPoll);
-    }
-}
-
 bool RunScript(const std::string& logical, char* const env[]) {
     static const ScriptSpawn spawn;
     pid_t pid = -1;
@@ -187,15 +158,9 @@ bool RunScript(const std::string& logical, char* const env[]) {
         return false;
     }
     int status = 0;
-    switch (WaitBounded(pid, status)) {
-        case Ending::kKilled:
-            VORN_LOG(LOG_ERR, "Plugin [%s] killed after %d ms", logical.c_str(), timeoutMs.load());
-            return false;
-        case Ending::kLost:
-            VORN_LOG(LOG_ERR, "Failed to wait for plugin [%s] errno [%d]", logical.c_str(), errno);
-            return false;
-        case Ending::kExited:
-            break;
+    if (!WaitUntil(pid, logical,
+                   Deadline::clock::now() + std::chrono::milliseconds(timeoutMs.load()), status)) {
+        return false;
     }
     if (WIFEXITED(status) && WEXITSTATUS(status) == 0) {
         return true;

@@ -75,12 +75,10 @@ TEST_F(QlibPluginTest, FailedAndHangingScriptsAreLoggedAndTheNextStillRuns) {
     EXPECT_EQ(QLIBCErrGet(), QLIBC_ERR_EXEC);
     EXPECT_EQ(root_.ReadFile("/tmp/report"), "after\n");
     const auto logged = [](const std::string& tail) {
-        using ::testing::HasSubstr;
-        return ::testing::AllOf(HasSubstr("qlib_plugin.cpp:"),
-                                HasSubstr("Plugin [" + kHookDir + tail));
+        return ::testing::HasSubstr(kHookDir + tail);
     };
     EXPECT_THAT(log_.Lines(), ElementsAre(logged("10-fails] exited with [3]"),
-                                          logged("20-hangs] killed after 300 ms"),
+                                          logged("20-hangs]: still running at its deadline"),
                                           logged("30-killed-by-signal] ended by signal [15]")));
 
     // The orphaned child is gone (or at most a zombie waiting for its new parent).

@@ -176,8 +176,7 @@ bool WaitUntil(pid_t pid, const std::string& program, Deadline deadline, int& st
             kill(-pid, SIGKILL);
             while (waitpid(pid, &status, 0) < 0 && errno == EINTR) {
             }
-            VORN_LOG(LOG_ERR, "Killed [%s]: still running after %d ms", program.c_str(),
-                     ProgramTimeout());
+            VORN_LOG(LOG_ERR, "Killed [%s]: still running at its deadline", program.c_str());
             return false;
         }
         std::this_thread::sleep_for(poll);
