@@ -27,6 +27,7 @@ using vornwireless::utils::MacAddress;
 
 constexpr const char* kHostapdDir = "/etc/hostapd";
 constexpr const char* kMacList = "/etc/hostapd/hostapd-mac.list";
+constexpr const char* kControlDir = "/var/run/hostapd";
 constexpr const char* kNetworkScript = "/etc/rc.network";
 constexpr const char* kRfkill = "/usr/vorn/sbin/rfkill";
 constexpr const char* kHostapdCli = "/usr/bin/hostapd_cli";
@@ -253,7 +254,7 @@ std::string HostConf(const std::string& ifname, const AdapterConfig& config) {
     conf("interface", ifname)("driver", EnumMap<WIFI_DRIVER>::EnumToString(WIFI_DRIVER_NL80211));
     conf("ssid", config.ssid)("ignore_broadcast_ssid", config.display_ssid ? 0 : 1);
     conf("macaddr_acl", 0)("wpa_psk_file", "/etc/hostapd.psk")("wps_state", 2);
-    conf("ap_setup_locked", 1)("ctrl_interface", "/var/run/hostapd");
+    conf("ap_setup_locked", 1)("ctrl_interface", kControlDir);
     conf("config_methods", "label display push_button keypad");
     conf("max_num_sta", config.max_num_client);
     conf("bridge", utils::GetBridgeName(Adapter::GetTopology()));
@@ -270,7 +271,7 @@ std::string GuestConf(const std::string& ifname, const AdapterConfig& config) {
     ConfText conf;
     conf("bss", "g" + ifname)("bssid", config.guest_bssid.ToString());
     conf("ssid", config.guest_ssid)("ignore_broadcast_ssid", config.guest_display_ssid ? 0 : 1);
-    conf("ctrl_interface", "/var/run/hostapd")("max_num_sta", config.guest_max_num_client);
+    conf("ctrl_interface", kControlDir)("max_num_sta", config.guest_max_num_client);
     conf("bridge", "gbr" + std::to_string(utils::GetWirelessIndex(ifname)));
     if (!config.guest_allow_access_guest) {
         conf("ap_isolate", 1);
@@ -280,6 +281,10 @@ std::string GuestConf(const std::string& ifname, const AdapterConfig& config) {
         AddMacFilterLines(config.mac_filter_policy, conf);
     }
     return conf.Text();
+}
+
+std::string ConfigFile(const std::string& ifname, const char* suffix) {
+    return std::string(kHostapdDir) + "/hostapd-" + ifname + suffix;
 }
 
 bool WriteFile(const std::string& logical, const std::string& content) {
@@ -336,10 +341,6 @@ bool IsWpsPin(const std::string& pin) {
 }
 
 }  // namespace
-
-std::string AdapterAgentHostapd::ConfigFile(const std::string& ifname, const char* suffix) {
-    return std::string(kHostapdDir) + "/hostapd-" + ifname + suffix;
-}
 
 bool AdapterAgentHostapd::IsNameValid() const {
     if (!vornwireless::utils::IsValidInterfaceName(GetName())) {

@@ -42,9 +42,6 @@ class AdapterAgentHostapd : public AdapterAgentAP {
     // policy is unknown while rules are on, is refused (-1, logged) before any file changes.
     virtual int GenerateHostapdConfig(const AdapterConfig& config);
 
-    // "/etc/hostapd/hostapd-" + IF + suffix.
-    static std::string ConfigFile(const std::string& ifname, const char* suffix);
-
   protected:
     explicit AdapterAgentHostapd(const std::string& name) : AdapterAgentAP(name) {}
 
