@@ -20,7 +20,6 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
 constexpr unsigned int kUp = IFF_UP;
-constexpr unsigned int kRunning = IFF_UP | IFF_RUNNING | 0x10000;  // with IFF_LOWER_UP
 
 // rtnetlink messages laid out as the kernel does; AttrLength forges malformed ones.
 class Messages {
