@@ -3,8 +3,10 @@
 // for them).
 #include <dirent.h>
 
+#include <CLI/CLI.hpp>
+
+#include <algorithm>
 #include <cstdio>
-#include <cstring>
 #include <functional>
 #include <memory>
 #include <string>
@@ -399,68 +401,42 @@ const std::vector<RouteCommand>& RouteCommands() {
     return commands;
 }
 
-void Usage(FILE* out) {
-    std::fprintf(out,
-                 "Usage: vornnetdtool [--compact] COMMAND ARGUMENT\n"
-                 "       vornnetdtool --ready | --help | --version\n"
-                 "Calls the network daemon (com.tessarin.net on the session bus) and prints its\n"
-                 "answer as JSON (indented; one line with --compact). Exit status 0 on success,\n"
-                 "else the method's error number (1 when it has none), 2 for a usage error.\n\n"
-                 "Commands:\n");
-    for (const Command& command : Commands()) {
-        const std::string words = std::string(command.option) + " " + command.operand;
-        std::fprintf(out, "  %-34s %s\n", words.c_str(), command.help);
-    }
-    std::fprintf(
-        out,
-        "  --ready                            exit 0 when vornnetd runs and owns its name\n\n"
-        "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
-        "Example: vornnetdtool --add-gateway "
-        "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n\n"
-        "Route commands (run here, not in vornnetd; -4 IPv4, -6 IPv6):\n");
-    for (const RouteCommand& command : RouteCommands()) {
-        std::fprintf(out, "  %s %s\n      %s\n", command.option, command.operands, command.help);
-    }
-    std::fprintf(
-        out,
-        "A policy rule: {\"ifname\":\"eth0\",\"name\":\"lan\",\"ip\":\"10.1.0.0\","
-        "\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\"}\n"
-        "  (IPv6: \"prefix_length\":\"64\" for \"mask\"; no \"ip\": the table's default route).\n"
-        "A static route: {\"ip\":\"10.1.0.0\",\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\","
-        "\"ifname\":\"eth0\",\"enable\":true}.\n"
-        "An IPv6 router: {\"type\":\"native\",\"wan\":\"eth0\",\"is_default_gateway\":true};\n"
-        "  6in4 adds \"prefix\":\"2001:db8:1::/48\",\"remote_addr_v4\":\"198.51.100.1\",\n"
-        "  \"local_addr_v6\":\"2001:db8::2/64\"; 6to4 needs only the wan; wan \"pppoe\" is the\n"
-        "  current PPPoE interface.\n");
-}
+constexpr const char* kDescription =
+    "Calls the network daemon (com.tessarin.net on the session bus) and prints its answer as JSON\n"
+    "(indented; one line with --compact). Exit status 0 on success, else the method's error\n"
+    "number (1 when it has none), 2 for a usage error. Give one command.";
 
-// Runs a route command when words name one; false when they do not.
-bool RunRouteCommand(const std::vector<std::string>& words, bool compact, int& status) {
-    for (const RouteCommand& command : RouteCommands()) {
-        if (words.empty() || words[0] != command.option) {
-            continue;
-        }
-        const std::vector<std::string> operands(words.begin() + 1, words.end());
-        Json::Value data;
-        const int result = operands.size() < command.minWords || operands.size() > command.maxWords
-                               ? kUsageError
-                               : command.run(operands, data);
-        if (result == kUsageError) {
-            std::fprintf(stderr, "vornnetdtool: usage: %s %s\n", command.option, command.operands);
-            status = 2;
-        } else if (result < 0) {
-            std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command.option, result);
-            status = 1;
-        } else {
-            if (!data.isNull()) {
-                std::printf(
-                    "%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
-            }
-            status = 0;
-        }
-        return true;
+constexpr const char* kFooter =
+    "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
+    "Example: vornnetdtool --add-gateway "
+    "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n"
+    "A policy rule: {\"ifname\":\"eth0\",\"name\":\"lan\",\"ip\":\"10.1.0.0\","
+    "\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\"}\n"
+    "  (IPv6: \"prefix_length\":\"64\" for \"mask\"; no \"ip\": the table's default route).\n"
+    "A static route: {\"ip\":\"10.1.0.0\",\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\","
+    "\"ifname\":\"eth0\",\"enable\":true}.\n"
+    "An IPv6 router: {\"type\":\"native\",\"wan\":\"eth0\",\"is_default_gateway\":true};\n"
+    "  6in4 adds \"prefix\":\"2001:db8:1::/48\",\"remote_addr_v4\":\"198.51.100.1\",\n"
+    "  \"local_addr_v6\":\"2001:db8::2/64\"; 6to4 needs only the wan; wan \"pppoe\" is the\n"
+    "  current PPPoE interface.";
+
+// Runs a route command on its operands; the exit status.
+int RunRouteCommand(const RouteCommand& command, const std::vector<std::string>& operands,
+                    bool compact) {
+    Json::Value data;
+    const int result = command.run(operands, data);
+    if (result == kUsageError) {
+        std::fprintf(stderr, "vornnetdtool: usage: %s %s\n", command.option, command.operands);
+        return 2;
     }
-    return false;
+    if (result < 0) {
+        std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command.option, result);
+        return 1;
+    }
+    if (!data.isNull()) {
+        std::printf("%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
+    }
+    return 0;
 }
 
 bool BuildRequest(const Command& command, const std::string& text, Json::Value& request) {
@@ -488,23 +464,87 @@ int ExitStatus(int result) {
     return result < -125 ? 125 : -result;
 }
 
+// Shows each option's operands as written in the tables, nothing added.
+class OperandFormatter : public CLI::Formatter {
+  public:
+    std::string make_option_opts(const CLI::Option* option) const override {
+        return option->get_type_name().empty() ? "" : " " + option->get_type_name();
+    }
+};
+
+// Calls one method of the service; the exit status.
+int RunServiceCommand(const Command& command, const std::string& text, bool compact) {
+    Json::Value request;
+    if (!BuildRequest(command, text, request)) {
+        std::fprintf(stderr, "vornnetdtool: %s: '%s' is not a JSON object\n", command.option,
+                     text.c_str());
+        return 2;
+    }
+    NetClient client;
+    Json::Value data;
+    const int result = command.call(client, text, request, data);
+    if (result < 0) {
+        std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command.option, result);
+        return ExitStatus(result);
+    }
+    if (command.hasAnswer) {
+        std::printf("%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
+    }
+    return 0;
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
+    CLI::App app{kDescription, "vornnetdtool"};
+    app.set_version_flag("--version", "vornnetdtool 5.0.0");
+    app.footer(kFooter);
+    app.formatter(std::make_shared<OperandFormatter>());
+    app.get_formatter()->column_width(40);
     bool compact = false;
-    std::vector<std::string> words;
-    for (int i = 1; i < argc; ++i) {
-        if (std::strcmp(argv[i], "--compact") == 0) {
-            compact = true;
-        } else if (std::strcmp(argv[i], "--help") == 0) {
-            Usage(stdout);
-            return 0;
-        } else if (std::strcmp(argv[i], "--version") == 0) {
-            std::printf("vornnetdtool 5.0.0\n");
-            return 0;
-        } else {
-            words.emplace_back(argv[i]);
-        }
+    bool ready = false;
+    app.add_flag("--compact", compact, "print the answer on one line");
+    const char* serviceGroup = "Service commands";
+    app.add_flag("--ready", ready, "exit 0 when vornnetd runs and owns its name")
+        ->group(serviceGroup);
+    std::vector<std::string> serviceText(Commands().size());
+    std::vector<const CLI::Option*> serviceOptions;
+    for (std::size_t i = 0; i < Commands().size(); ++i) {
+        const Command& command = Commands()[i];
+        serviceOptions.push_back(app.add_option(command.option, serviceText[i], command.help)
+                                     ->type_name(command.operand)
+                                     ->group(serviceGroup));
+    }
+    std::vector<std::vector<std::string>> routeWords(RouteCommands().size());
+    std::vector<const CLI::Option*> routeOptions;
+    for (std::size_t i = 0; i < RouteCommands().size(); ++i) {
+        const RouteCommand& command = RouteCommands()[i];
+        CLI::Option* option = command.maxWords == 0
+                                  ? app.add_flag(command.option, command.help)
+                                  : app.add_option(command.option, routeWords[i], command.help)
+                                        ->type_name(command.operands)
+                                        ->expected(static_cast<int>(command.minWords),
+                                                   static_cast<int>(command.maxWords));
+        routeOptions.push_back(option->group("Route commands (run here, not in vornnetd)"));
+    }
+    try {
+        app.parse(argc, argv);
+    } catch (const CLI::Success& e) {
+        return app.exit(e);
+    } catch (const CLI::ParseError& e) {
+        std::fprintf(stderr,
+                     "vornnetdtool: unknown command or wrong arguments: %s\n"
+                     "Run with --help for the commands.\n",
+                     e.what());
+        return 2;
+    }
+    const auto given = [](const std::vector<const CLI::Option*>& options) {
+        return std::count_if(options.begin(), options.end(),
+                             [](const CLI::Option* option) { return option->count() > 0; });
+    };
+    if ((ready ? 1 : 0) + given(serviceOptions) + given(routeOptions) != 1) {
+        std::fprintf(stderr, "vornnetdtool: give exactly one command (--help lists them)\n");
+        return 2;
     }
     vorn::platform::PrefixPathWithRoot();
     // The library's failure lines (the service's error text among them) are the user's answer.
@@ -515,43 +555,23 @@ int main(int argc, char** argv) {
             std::fprintf(stderr, "vornnetdtool: %s\n", line.c_str());
         }
     });
-    if (words.size() == 1 && words[0] == "--ready") {
-        const bool ready = NetClient().IsServerReady();
-        std::printf("%s\n", ready ? "ready" : "not ready");
-        return ready ? 0 : 1;
+    if (ready) {
+        const bool up = NetClient().IsServerReady();
+        std::printf("%s\n", up ? "ready" : "not ready");
+        return up ? 0 : 1;
     }
-    int status = 0;
-    if (RunRouteCommand(words, compact, status)) {
-        return status;
-    }
-    const Command* command = nullptr;
-    for (const Command& candidate : Commands()) {
-        if (!words.empty() && words[0] == candidate.option) {
-            command = &candidate;
+    for (std::size_t i = 0; i < routeOptions.size(); ++i) {
+        if (routeOptions[i]->count() > 0) {
+            // An option given without its optional words holds one empty word.
+            std::vector<std::string>& words = routeWords[i];
+            words.erase(std::remove(words.begin(), words.end(), ""), words.end());
+            return RunRouteCommand(RouteCommands()[i], words, compact);
         }
     }
-    if (command == nullptr || words.size() != 2) {
-        std::fprintf(
-            stderr, "vornnetdtool: %s\n",
-            words.empty() ? "no command given" : "unknown command or wrong number of arguments");
-        Usage(stderr);
-        return 2;
+    for (std::size_t i = 0; i < serviceOptions.size(); ++i) {
+        if (serviceOptions[i]->count() > 0) {
+            return RunServiceCommand(Commands()[i], serviceText[i], compact);
+        }
     }
-    Json::Value request;
-    if (!BuildRequest(*command, words[1], request)) {
-        std::fprintf(stderr, "vornnetdtool: %s: '%s' is not a JSON object\n", command->option,
-                     words[1].c_str());
-        return 2;
-    }
-    NetClient client;
-    Json::Value data;
-    const int result = command->call(client, words[1], request, data);
-    if (result < 0) {
-        std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command->option, result);
-        return ExitStatus(result);
-    }
-    if (command->hasAnswer) {
-        std::printf("%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
-    }
-    return 0;
+    return 2;
 }
