@@ -2,6 +2,7 @@
 
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
+#include "wifi/adapter/adapter_agent_client.h"
 #include "wifi/adapter/adapter_agent_hostapd_bridge.h"
 #include "wifi/adapter/adapter_agent_hostapd_router.h"
 #include "wifi/settings/enum_map.h"
@@ -59,12 +60,14 @@ AdapterAgent* AdapterAgent::Create(const AdapterConfig& config) {
             return new AdapterAgentHostapdRouter(config.name);
         case Kind::kHostapdBridge:
             return new AdapterAgentHostapdBridge(config.name);
+        case Kind::kClient:
+            return new AdapterAgentClient(config.name);
         case Kind::kNone:
             return nullptr;
         default:
             break;
     }
-    // The RLT and station agents are not part of this build yet.
+    // The RLT agents are not part of this build yet.
     VORN_LOG(LOG_ERR, "No %s agent for [%s] in this build", KindName(kind), config.name.c_str());
     return nullptr;
 }

@@ -1,0 +1,519 @@
+#include "wifi/adapter/adapter_agent_client.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cctype>
+#include <cerrno>
+#include <csignal>
+#include <cstdio>
+#include <cstring>
+#include <sstream>
+
+#include "platform/qlibc_file.h"
+#include "platform/qlibc_proc.h"
+#include "platform/root_path.h"
+#include "platform/shell_command.h"
+#include "platform/text_file.h"
+#include "utils/decimal.h"
+#include "utils/log.h"
+#include "utils/process.h"
+#include "wifi/adapter/adapter.h"
+#include "wifi/settings/enum_map.h"
+#include "wifi/utils/station_utils.h"
+#include "wifi/utils/utils.h"
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+using StationInfo = AdapterConfig::StationInfo;
+
+constexpr const char* kWpaCli = "/usr/sbin/wpa_cli";
+constexpr const char* kWpaSupplicant = "/usr/sbin/wpa_supplicant";
+constexpr const char* kSupplicantName = "wpa_supplicant";
+constexpr const char* kReconnectScript = "/usr/vorn/etc/wifi/wpa_post_reconnect.sh";
+constexpr const char* kIwconfig = "/sbin/iwconfig";
+constexpr const char* kIfconfig = "/sbin/ifconfig";
+constexpr const char* kRfkill = "/usr/vorn/sbin/rfkill";
+constexpr const char* kZeroBssid = "00:00:00:00:00:00";
+constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
+constexpr int kQuietFlags = kExecFlags | QLIBC_EXEC_NO_STDERR;
+constexpr int kAssociationPolls = 15;
+constexpr int kTerminateAttempts = 3;
+constexpr int kDownAttempts = 3;
+constexpr std::size_t kMaxSsidBytes = 32;
+constexpr std::size_t kStateBytes = 128;
+// A few hundred networks in range at most; a line of the listing is well under 128 bytes.
+constexpr std::size_t kMaxScanLines = 512;
+constexpr std::size_t kScanLineBytes = 256;
+constexpr int kMaxChannel = 200;
+constexpr int kMaxSignal = 100;
+
+bool IsPrintableAscii(unsigned char c) {
+    return c >= 0x20 && c < 0x7f;
+}
+
+bool IsHex(const std::string& text) {
+    return std::all_of(text.begin(), text.end(),
+                       [](char c) { return std::isxdigit(static_cast<unsigned char>(c)) != 0; });
+}
+
+// What the supplicant reads between double quotes up to the last one, byte for byte.
+bool IsQuotable(const std::string& text) {
+    return std::all_of(text.begin(), text.end(), [](char c) {
+        const auto byte = static_cast<unsigned char>(c);
+        return c != '"' && byte >= 0x20 && byte != 0x7f;
+    });
+}
+
+std::string Quoted(const std::string& text) {
+    return "\"" + text + "\"";
+}
+
+std::string ToHex(const std::string& bytes) {
+    static const char kDigits[] = "0123456789abcdef";
+    std::string hex;
+    for (char c : bytes) {
+        const auto byte = static_cast<unsigned char>(c);
+        hex += kDigits[byte >> 4];
+        hex += kDigits[byte & 0x0f];
+    }
+    return hex;
+}
+
+bool FromHex(const std::string& hex, std::string& bytes) {
+    if (hex.size() % 2 != 0 || !IsHex(hex)) {
+        return false;
+    }
+    bytes.clear();
+    for (std::size_t i = 0; i < hex.size(); i += 2) {
+        bytes += static_cast<char>(std::stoi(hex.substr(i, 2), nullptr, 16));
+    }
+    return true;
+}
+
+bool Refuse(const char* what) {
+    VORN_LOG(LOG_ERR, "Refused %s for the supplicant file", what);
+    return false;
+}
+
+bool AddSsid(const std::string& essid, std::string& text) {
+    if (essid.empty() || essid.size() > kMaxSsidBytes) {
+        return Refuse("essid length");
+    }
+    const bool plain = std::all_of(essid.begin(), essid.end(), [](char c) {
+        return IsPrintableAscii(static_cast<unsigned char>(c)) && c != '"' && c != '\\';
+    });
+    text += "\tssid=" + (plain ? Quoted(essid) : ToHex(essid)) + "\n";
+    return true;
+}
+
+bool AddPairwise(const StationInfo& station, const char* kind, std::string& text) {
+    switch (station.encryption) {
+        case WIFI_ENCRYPTION_TKIP:
+            text += "\tpairwise=TKIP\n";
+            return true;
+        case WIFI_ENCRYPTION_AES:
+            text += "\tpairwise=CCMP\n";
+            return true;
+        case WIFI_ENCRYPTION_TKIP_AES:
+            text += "\tpairwise=TKIP CCMP\n";
+            return true;
+        default:
+            break;
+    }
+    VORN_LOG(LOG_ERR, "Unknown encryption [%d] for %s security [%d]",
+             static_cast<int>(station.encryption), kind, static_cast<int>(station.security));
+    return false;
+}
+
+bool AddWepKey(const std::string& key, std::string& text) {
+    if ((key.size() == 5 || key.size() == 13) && IsQuotable(key)) {
+        text += "\twep_key0=" + Quoted(key) + "\n";
+    } else if ((key.size() == 10 || key.size() == 26) && IsHex(key)) {
+        text += "\twep_key0=" + key + "\n";
+    } else {
+        VORN_LOG(LOG_ERR, "Wrong WEP Format.");
+        return false;
+    }
+    text += "\twep_tx_keyidx=0\n\tauth_alg=OPEN SHARED\n";
+    return true;
+}
+
+// A passphrase of 8 to 63 characters, or the key itself as 64 hex digits.
+bool AddPsk(const std::string& password, std::string& text) {
+    if (password.size() == 64 && IsHex(password)) {
+        text += "\tpsk=" + password + "\n";
+    } else if (password.size() >= 8 && password.size() <= 63 && IsQuotable(password)) {
+        text += "\tpsk=" + Quoted(password) + "\n";
+    } else {
+        return Refuse("password");
+    }
+    return true;
+}
+
+bool AddSecurityLines(const StationInfo& station, std::string& text) {
+    switch (station.security) {
+        case WIFI_SECURITY_DISABLED:
+            text += "\tkey_mgmt=NONE\n";
+            return true;
+        case WIFI_SECURITY_WEP:
+            text += "\tkey_mgmt=NONE\n";
+            return AddWepKey(station.password, text);
+        case WIFI_SECURITY_PERSONAL_WPA:
+        case WIFI_SECURITY_PERSONAL_WPA2:
+        case WIFI_SECURITY_PERSONAL_WPA_MIXED:
+            text += "\tkey_mgmt=WPA-PSK\n";
+            return AddPairwise(station, "personal", text) && AddPsk(station.password, text);
+        case WIFI_SECURITY_ENTERPRISE_WPA:
+        case WIFI_SECURITY_ENTERPRISE_WPA2:
+        case WIFI_SECURITY_ENTERPRISE_WPA_MIXED:
+            if (!IsQuotable(station.user) || !IsQuotable(station.password)) {
+                return Refuse("identity or password");
+            }
+            text += "\tkey_mgmt=WPA-EAP\n\teap=TTLS PEAP\n";
+            if (!AddPairwise(station, "enterprise", text)) {
+                return false;
+            }
+            text += "\tidentity=" + Quoted(station.user) + "\n";
+            text += "\tpassword=" + Quoted(station.password) + "\n";
+            return true;
+        default:
+            break;
+    }
+    VORN_LOG(LOG_ERR, "Failed to detect authentication/encryption type");
+    return false;
+}
+
+bool AddBssid(const vornwireless::utils::MacAddress& bssid, std::string& text) {
+    if (bssid.ToString().empty() || bssid.ToString() == kZeroBssid) {
+        return true;
+    }
+    if (!bssid.IsFormalized()) {
+        return Refuse("bssid");
+    }
+    text += "\tbssid=" + bssid.ToString() + "\n";
+    return true;
+}
+
+// Printable words only: a scan word may reach a log line.
+bool IsWord(const std::string& word) {
+    return std::all_of(word.begin(), word.end(),
+                       [](char c) { return std::isgraph(static_cast<unsigned char>(c)) != 0; });
+}
+
+bool ParseScanLine(const std::string& line, StationInfo& station) {
+    std::istringstream in(line);
+    std::string words[7];
+    for (std::string& word : words) {
+        if (!(in >> word) || !IsWord(word)) {
+            return false;
+        }
+    }
+    std::string extra;
+    if (in >> extra) {
+        return false;
+    }
+    station.bssid = vornwireless::utils::MacAddress(words[0]);
+    if (!station.bssid.IsFormalized() ||
+        !vornwireless::utils::ParseDecimal(words[1], station.channel) || station.channel < 0 ||
+        station.channel > kMaxChannel ||
+        !vornwireless::utils::ParseDecimal(words[2], station.signal) || station.signal < 0 ||
+        station.signal > kMaxSignal || !FromHex(words[6], station.essid) || station.essid.empty() ||
+        station.essid.size() > kMaxSsidBytes) {
+        return false;
+    }
+    station.opmode = EnumMap<WIFI_OPMODE>::StringToEnum(words[3]);
+    station.hwmode = EnumMap<WIFI_MODE>::StringToEnum(words[4]);
+    if (station.opmode == WIFI_OPMODE_ERROR || station.hwmode == WIFI_MODE_ERROR) {
+        return false;
+    }
+    if (AdapterAgentClientBase::ParseSecurityEncryption(words[5], station.security,
+                                                        station.encryption) != 0) {
+        VORN_LOG(LOG_ERR, "Failed on parsing security and encryption from string [%s]",
+                 words[5].c_str());
+        return false;
+    }
+    station.is_dhcp = true;
+    return true;
+}
+
+}  // namespace
+
+std::string AdapterAgentClient::ConfigFile(const std::string& ifname) {
+    return "/usr/vorn/etc/wpa_supplicant.conf." + ifname;
+}
+
+std::string AdapterAgentClient::PidFile(const std::string& ifname) {
+    return "/var/run/wpa_supplicant.pid." + ifname;
+}
+
+int AdapterAgentClient::WpaSupplicantConfigText(const StationInfo& station, std::string& text) {
+    std::string built = "ctrl_interface=/var/run/wpa_supplicant\nnetwork={\n";
+    if (!AddSsid(station.essid, built) || !AddBssid(station.bssid, built)) {
+        return -1;
+    }
+    built += "\tscan_ssid=1\n";
+    if (station.opmode == WIFI_OPMODE_AD_HOC) {
+        built += "\tmode=1\n";
+    }
+    if (!AddSecurityLines(station, built)) {
+        return -1;
+    }
+    text = built + "}\n";
+    return 0;
+}
+
+std::vector<StationInfo> AdapterAgentClient::ParseScanList(const std::vector<std::string>& lines) {
+    std::vector<StationInfo> stations;
+    std::size_t refused = 0;
+    for (const std::string& line : lines) {
+        StationInfo station;
+        if (ParseScanLine(line, station)) {
+            stations.push_back(station);
+        } else {
+            ++refused;
+        }
+    }
+    if (refused != 0) {
+        VORN_LOG(LOG_INFO, "Left out %zu scan lines of unknown form", refused);
+    }
+    return stations;
+}
+
+int AdapterAgentClient::SetWpaSupplicantConfig() const {
+    std::string text;
+    const std::string file = ConfigFile(GetName());
+    if (WpaSupplicantConfigText(Station(), text) != 0) {
+    } else if (!vorn::platform::WriteFileAtomically(vorn::platform::RootPath(file), text)) {
+        VORN_LOG(LOG_ERR, "Failed to open file [%s].", file.c_str());
+    } else {
+        return 0;
+    }
+    VORN_LOG(LOG_ERR, "Failed to write wpa sup config to file");
+    return -1;
+}
+
+std::string AdapterAgentClient::WpaState() const {
+    const std::string command =
+        std::string(kWpaCli) + " -i " + GetName() + " status | grep wpa_state";
+    std::string line;
+    char state[kStateBytes] = {};
+    if (!IsNameValid() || vorn::platform::ReadShellCommandLine(command, line, kStateBytes) != 0 ||
+        std::sscanf(line.c_str(), " wpa_state=%127s", state) != 1) {
+        return "";
+    }
+    return state;
+}
+
+bool AdapterAgentClient::WaitForAssociation() const {
+    for (int poll = 0; poll < kAssociationPolls; ++poll) {
+        Pause();
+        if (WpaState() == "COMPLETED") {
+            return true;
+        }
+    }
+    return false;
+}
+
+// The pid file's process when it is a supplicant: a stale file may name another program.
+int AdapterAgentClient::SupplicantPid() const {
+    const int pid = QLIBCReadPidFile(PidFile(GetName()).c_str());
+    std::vector<int> supplicants;
+    if (pid <= 0 || !vornwireless::utils::FindProcesses(kSupplicantName, supplicants) ||
+        std::find(supplicants.begin(), supplicants.end(), pid) == supplicants.end()) {
+        return 0;
+    }
+    return pid;
+}
+
+int AdapterAgentClient::TerminateWpa() const {
+    return QLIBCExecl(kWpaCli, kQuietFlags, "-i", GetName().c_str(), "terminate", nullptr);
+}
+
+// Asked three times; a supplicant that stays is killed, so none outlives a disconnect.
+int AdapterAgentClient::DisconnectKillWpa() const {
+    const std::string pidFile = PidFile(GetName());
+    const int pid = SupplicantPid();
+    if (pid == 0) {
+        VORN_LOG(LOG_ERR, "Cannot find process wpa_supplicant with pid file (%s)", pidFile.c_str());
+        QLIBCSysUnlink(pidFile.c_str());
+        return 0;
+    }
+    for (int attempt = 1; attempt <= kTerminateAttempts && QLIBCProcAlive(pid) == 1; ++attempt) {
+        TerminateWpa();
+        if (SupplicantPid() != pid) {
+            break;
+        }
+        VORN_LOG(LOG_ERR, "Process wpa (%d) still alive, wait 1 sec (%d)", pid, attempt);
+        Pause();
+    }
+    if (SupplicantPid() == pid) {
+        VORN_LOG(LOG_ERR, "Process wpa (%d) ignored terminate, killed", pid);
+        kill(pid, SIGKILL);
+    }
+    QLIBCSysUnlink(pidFile.c_str());
+    return 0;
+}
+
+int AdapterAgentClient::DoConnecting() {
+    if (!IsNameValid()) {
+        return -1;
+    }
+    const std::string& name = GetName();
+    const std::string config = vorn::platform::RootPath(ConfigFile(name));
+    const std::string pid = vorn::platform::RootPath(PidFile(name));
+    const std::string watch = std::string("-a") + vorn::platform::RootPath(kReconnectScript);
+    if (utils::GetAdapterNum() == 0) {
+        VORN_LOG(LOG_ERR, "There is no wireless USB adapter plugged");
+        return -1;
+    }
+    if (SetWpaSupplicantConfig() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to set WPA Supplicant Config file");
+        return -1;
+    }
+    if (QLIBCFileExist(PidFile(name).c_str()) == 1 && TerminateWpa() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to termiante wpa process");
+        return -1;
+    }
+    if (QLIBCExecl(kWpaSupplicant, kExecFlags, "-Dwext", "-i", name.c_str(), "-c", config.c_str(),
+                   "-B", "-P", pid.c_str(), nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to execute command [%s -Dwext -i %s -c %s -B -P %s]",
+                 kWpaSupplicant, name.c_str(), config.c_str(), pid.c_str());
+        return -1;
+    }
+    if (!WaitForAssociation()) {
+        VORN_LOG(LOG_ERR, "Time out to connect AP, kill wpa_supplicant.");
+        DisconnectKillWpa();
+        return -1;
+    }
+    if (QLIBCExecl(kWpaCli, QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT, "-i", name.c_str(),
+                   watch.c_str(), nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to fork process [%d]", errno);
+        return -1;
+    }
+    if (SetupAddress() != 0) {
+        VORN_LOG(LOG_ERR, "Failed on post processing");
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentClient::BlockRadioWhenUnused() const {
+    if (Adapter::GetEnabledAdapterCount() != 0 || !utils::IsKiteAModel() ||
+        QLIBCFileExist(kRfkill) != 1) {
+        return 0;
+    }
+    if (QLIBCExecl(kRfkill, kExecFlags, "block", "wifi", nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to execute rfkill block");
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentClient::TakeInterfaceDown() const {
+    const char* name = GetName().c_str();
+    for (int attempt = 1; attempt <= kDownAttempts; ++attempt) {
+        if (QLIBCExecl(kIwconfig, kExecFlags, name, "essid", "off", nullptr) == 0 &&
+            QLIBCExecl(kIfconfig, kExecFlags, name, "0.0.0.0", nullptr) == 0) {
+            return 0;
+        }
+        if (attempt < kDownAttempts) {
+            VORN_LOG(LOG_ERR, "Failed to stop wireless interface, retry in one sec (%d)", attempt);
+            Pause();
+        }
+    }
+    VORN_LOG(LOG_ERR, "Failed to deactivate network interface [%s].", name);
+    return -1;
+}
+
+int AdapterAgentClient::DoDisconnect() {
+    if (!IsNameValid()) {
+        return -1;
+    }
+    const std::string iface = "IFACE=" + GetName();
+    if (DisconnectKillWpa() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to disconnect on kill wpa part");
+        return -1;
+    }
+    if (QLIBCExecl("/sbin/stop", kQuietFlags, "dhcp-client", iface.c_str(), nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "unable to stop dhcp-client instance on %s", GetName().c_str());
+        VORN_LOG(LOG_ERR, "Failed to disconnect on kill dhcp part");
+        return -1;
+    }
+    BlockRadioWhenUnused();
+    if (TakeInterfaceDown() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to disconnect on down interface part");
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentClient::GetClientConfig(const AdapterConfig& config) {
+    if (config.stations.empty()) {
+        VORN_LOG(LOG_ERR, "No network to join for [%s]", GetName().c_str());
+        return -1;
+    }
+    SetStation(config.stations.back());
+    return 0;
+}
+
+int AdapterAgentClient::ClientRecover(const AdapterConfig& config) {
+    if (SupplicantPid() != 0 && WpaState() == "COMPLETED") {
+        return 0;
+    }
+    return ClientEnable(config);
+}
+
+int AdapterAgentClient::ClientDisable(const AdapterConfig&) {
+    const int disconnected = DoDisconnect();
+    const int removed = RemoveGateway();
+    return disconnected == 0 && removed == 0 ? 0 : -1;
+}
+
+WIFI_STATUS AdapterAgentClient::GetStatus(const AdapterConfig& config) const {
+    if (!config.client_enabled) {
+        return WIFI_STATUS_DISABLED;
+    }
+    if (WpaState() == "COMPLETED") {
+        return IpStatus();
+    }
+    return SupplicantPid() != 0 ? WIFI_STATUS_ENABLING : WIFI_STATUS_DISABLED;
+}
+
+int AdapterAgentClient::ScanNetworks(const AdapterConfig& config,
+                                     std::vector<StationInfo>& stations) {
+    if (!IsNameValid()) {
+        return -1;
+    }
+    if (!utils::IsNetActivate(GetName()) &&
+        QLIBCExecl(kIfconfig, kExecFlags, GetName().c_str(), "up", nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to enable interface [%s]", GetName().c_str());
+        return -1;
+    }
+    if (QuickScanNetworks(config, stations) != 0) {
+        VORN_LOG(LOG_ERR, "Failed on doing network scan");
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentClient::QuickScanNetworks(const AdapterConfig&,
+                                          std::vector<StationInfo>& stations) {
+    if (!IsNameValid()) {
+        return -1;
+    }
+    const std::string command = "/sbin/iwlist " + GetName() + " scanning vorn";
+    std::vector<std::string> lines;
+    if (vorn::platform::ReadShellCommandLines(command, lines, kMaxScanLines, kScanLineBytes) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to popen '%s', errno=%d", command.c_str(), errno);
+        return -1;
+    }
+    const std::vector<StationInfo> found = ParseScanList(lines);
+    stations.insert(stations.end(), found.begin(), found.end());
+    return 0;
+}
+
+}  // namespace wifi
+}  // namespace vornwireless

@@ -1,0 +1,265 @@
+#include "wifi/adapter/adapter_agent_client.h"
+
+#include <gmock/gmock.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <csignal>
+
+#include "support/sim_root.h"
+#include "wifi/adapter/adapter.h"
+
+extern char** environ;
+
+namespace vornwireless {
+namespace wifi {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using StationInfo = AdapterConfig::StationInfo;
+
+StationInfo Network(WIFI_SECURITY security, WIFI_ENCRYPTION encryption,
+                    const std::string& password) {
+    StationInfo station;
+    station.essid = "home";
+    station.bssid = vornwireless::utils::MacAddress("02:00:00:00:00:01");
+    station.opmode = WIFI_OPMODE_MANAGED;
+    station.security = security;
+    station.encryption = encryption;
+    station.user = "ann";
+    station.password = password;
+    station.is_dhcp = true;
+    return station;
+}
+
+// The security lines: what follows "scan_ssid=1".
+std::string SecurityLines(const StationInfo& station) {
+    std::string text;
+    if (AdapterAgentClient::WpaSupplicantConfigText(station, text) != 0) {
+        return "refused";
+    }
+    const std::string::size_type start = text.find("scan_ssid=1\n");
+    return text.substr(start + 12, text.size() - start - 14);
+}
+
+class AdapterAgentClientTest : public vorn::test::RootTest {
+  protected:
+    void SetUp() override {
+        AdapterAgentClientBase::SetPollInterval(std::chrono::milliseconds(1));
+        setenv("DBUS_SESSION_BUS_ADDRESS", "unix:path=/nonexistent/vorn-dead-bus", 1);
+        root_.Scenario("iwconfig", "when wlan0\nprint wlan0     IEEE 802.11bgn  ESSID:off/any\n");
+        root_.Scenario("ip",
+                       "when -4 -o addr show dev wlan0\n"
+                       "print 3: wlan0    inet 192.168.1.50/24 scope global wlan0\n");
+    }
+    void TearDown() override { AdapterAgentClientBase::SetPollInterval(std::chrono::seconds(1)); }
+
+    long CallsStartingWith(const std::string& prefix) const {
+        const auto calls = root_.Calls();
+        return std::count_if(calls.begin(), calls.end(), [&prefix](const std::string& call) {
+            return call.compare(0, prefix.size(), prefix) == 0;
+        });
+    }
+
+    vorn::test::SavedVariable bus_{"DBUS_SESSION_BUS_ADDRESS"};
+    AdapterAgentClient agent_{"wlan0"};
+};
+
+TEST_F(AdapterAgentClientTest, SupplicantFileBySecurityAndRefusedTexts) {
+    StationInfo open = Network(WIFI_SECURITY_DISABLED, WIFI_ENCRYPTION_NONE, "");
+    open.bssid = vornwireless::utils::MacAddress("00:00:00:00:00:00");
+    open.opmode = WIFI_OPMODE_AD_HOC;
+    std::string text;
+    ASSERT_EQ(AdapterAgentClient::WpaSupplicantConfigText(open, text), 0);
+    EXPECT_EQ(text,
+              "ctrl_interface=/var/run/wpa_supplicant\nnetwork={\n\tssid=\"home\"\n"
+              "\tscan_ssid=1\n\tmode=1\n\tkey_mgmt=NONE\n}\n");
+    const std::string wepTail = "\twep_tx_keyidx=0\n\tauth_alg=OPEN SHARED\n";
+    EXPECT_EQ(SecurityLines(Network(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_NONE, "ab\\cd")),
+              "\tkey_mgmt=NONE\n\twep_key0=\"ab\\cd\"\n" + wepTail);
+    EXPECT_EQ(SecurityLines(Network(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_NONE, "0123456789")),
+              "\tkey_mgmt=NONE\n\twep_key0=0123456789\n" + wepTail);
+    EXPECT_EQ(SecurityLines(Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "secret99")),
+              "\tkey_mgmt=WPA-PSK\n\tpairwise=CCMP\n\tpsk=\"secret99\"\n");
+    const std::string hexKey(64, 'a');
+    EXPECT_EQ(
+        SecurityLines(Network(WIFI_SECURITY_PERSONAL_WPA_MIXED, WIFI_ENCRYPTION_TKIP_AES, hexKey)),
+        "\tkey_mgmt=WPA-PSK\n\tpairwise=TKIP CCMP\n\tpsk=" + hexKey + "\n");
+    EXPECT_EQ(SecurityLines(Network(WIFI_SECURITY_ENTERPRISE_WPA, WIFI_ENCRYPTION_TKIP, "pw")),
+              "\tkey_mgmt=WPA-EAP\n\teap=TTLS PEAP\n\tpairwise=TKIP\n\tidentity=\"ann\"\n"
+              "\tpassword=\"pw\"\n");
+    // A neighbour's essid is carried in hex; it can add no line of its own.
+    StationInfo hostile = open;
+    hostile.essid = "x\"\n\tctrl_interface=/tmp";
+    ASSERT_EQ(AdapterAgentClient::WpaSupplicantConfigText(hostile, text), 0);
+    EXPECT_THAT(text, HasSubstr("\tssid=78220a096374726c5f696e746572666163653d2f746d70\n"));
+
+    for (const StationInfo& refused :
+         {Network(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_NONE, "123456789012"),
+          Network(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_NONE, "ghijklmnop"),
+          Network(WIFI_SECURITY_PERSONAL_WPA, WIFI_ENCRYPTION_NONE, "secret99"),
+          Network(WIFI_SECURITY_PERSONAL_WPA, WIFI_ENCRYPTION_AES, "secret\"99"),
+          Network(WIFI_SECURITY_ENTERPRISE_WPA2, WIFI_ENCRYPTION_AES, "pw\n}\nnetwork={"),
+          Network(WIFI_SECURITY_ERROR, WIFI_ENCRYPTION_AES, "secret99")}) {
+        EXPECT_EQ(SecurityLines(refused), "refused") << refused.password;
+    }
+    for (const char* message :
+         {"Wrong WEP Format.", "Unknown encryption [1] for personal security [3]",
+          "Failed to detect authentication/encryption type"}) {
+        EXPECT_TRUE(log_.Contains(message)) << message;
+    }
+    // A refused network leaves the file as it was.
+    root_.WriteFile(AdapterAgentClient::ConfigFile("wlan0"), "before\n");
+    AdapterConfig config;
+    config.stations = {Network(WIFI_SECURITY_PERSONAL_WPA, WIFI_ENCRYPTION_AES, "a\"b")};
+    ASSERT_EQ(agent_.GetClientConfig(config), 0);
+    EXPECT_EQ(agent_.DoConnecting(), -1);
+    EXPECT_EQ(root_.ReadFile(AdapterAgentClient::ConfigFile("wlan0")), "before\n");
+    EXPECT_THAT(root_.Calls(), ::testing::IsEmpty());
+}
+
+TEST_F(AdapterAgentClientTest, ScanWordsAndHostileListing) {
+    WIFI_SECURITY security;
+    WIFI_ENCRYPTION encryption;
+    ASSERT_EQ(
+        AdapterAgentClientBase::ParseSecurityEncryption("WPA1WPA2PSKTKIPAES", security, encryption),
+        0);
+    EXPECT_EQ(std::make_pair(security, encryption),
+              std::make_pair(WIFI_SECURITY_PERSONAL_WPA_MIXED, WIFI_ENCRYPTION_TKIP_AES));
+    ASSERT_EQ(AdapterAgentClientBase::ParseSecurityEncryption("WEP", security, encryption), 0);
+    EXPECT_EQ(std::make_pair(security, encryption),
+              std::make_pair(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_NONE));
+    ASSERT_EQ(AdapterAgentClientBase::ParseSecurityEncryption("WPA2EAPAES", security, encryption),
+              0);
+    EXPECT_EQ(std::make_pair(security, encryption),
+              std::make_pair(WIFI_SECURITY_ENTERPRISE_WPA2, WIFI_ENCRYPTION_AES));
+    EXPECT_EQ(AdapterAgentClientBase::ParseSecurityEncryption("PSKAES", security, encryption), -1);
+    EXPECT_EQ(AdapterAgentClientBase::ParseSecurityEncryption("WPA2PSK", security, encryption), -1);
+
+    root_.Scenario("iwlist",
+                   "when wlan0 scanning vorn\n"
+                   "print 02:00:00:00:00:01 6 80 Managed bgn WPA2PSKAES 686f6d65\n"
+                   "print 02:00:00:00:00:02 1 30 Ad g NONE 782209\n"
+                   "print " +
+                       std::string(300, 'A') +
+                       "\n"
+                       "print 02:00:00:00:00:03 6 80 Managed bgn WPA2PSKAES 686f6d65 extra\n"
+                       "print 02:00:00:00:00:04 6 80 Master bgn WPA2PSKAES 6\n"
+                       "print 02:00:00:00:00:05 6 80 Weird bgn WPA2PSKAES 686f6d65\n"
+                       "print 02:00:00:00:00:06 6 180 Managed bgn WPA2PSKAES 686f6d65\n"
+                       "print 02:00:00:00:00:07 6 80 Managed bgn WPA2PSK 686f6d65\n"
+                       "print zz:00:00:00:00:08 6 80 In bgn NONE 686f6d65\n");
+    std::vector<StationInfo> found;
+    ASSERT_EQ(agent_.QuickScanNetworks(AdapterConfig(), found), 0);
+    EXPECT_THAT(root_.Calls(), ElementsAre("/sbin/iwlist wlan0 scanning vorn"));
+    ASSERT_EQ(found.size(), 2u);
+    EXPECT_EQ(found[0].essid, "home");
+    EXPECT_EQ(found[0].bssid.ToString(), "02:00:00:00:00:01");
+    EXPECT_EQ(found[0].channel, 6);
+    EXPECT_EQ(found[0].signal, 80);
+    EXPECT_EQ(found[0].opmode, WIFI_OPMODE_MANAGED);
+    EXPECT_EQ(found[0].hwmode, WIFI_MODE_BGN);
+    EXPECT_EQ(found[0].security, WIFI_SECURITY_PERSONAL_WPA2);
+    EXPECT_EQ(found[1].essid, "x\"\t");
+    EXPECT_EQ(found[1].opmode, WIFI_OPMODE_AD_HOC);
+    EXPECT_EQ(found[1].security, WIFI_SECURITY_DISABLED);
+    EXPECT_TRUE(log_.Contains("Failed on parsing security and encryption from string [WPA2PSK]"));
+}
+
+TEST_F(AdapterAgentClientTest, ConnectGivesUpAfterFifteenPollsAndThenAddressesAreChecked) {
+    // A supplicant that ignores wpa_cli, as a hung one would.
+    const std::string program = root_.Path("/tmp/wpa_supplicant");
+    ASSERT_EQ(symlink("/bin/sleep", program.c_str()), 0);
+    pid_t hung = 0;
+    char* argv[] = {const_cast<char*>(program.c_str()), const_cast<char*>("30"), nullptr};
+    ASSERT_EQ(posix_spawn(&hung, program.c_str(), nullptr, nullptr, argv, environ), 0);
+    root_.WriteFile(AdapterAgentClient::PidFile("wlan0"), std::to_string(hung) + "\n");
+    root_.Scenario("wpa_cli", "when -i wlan0 status\nprint wpa_state=SCANNING\n");
+    AdapterConfig config;
+    config.client_enabled = true;
+    config.stations = {Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "secret99")};
+    ASSERT_EQ(agent_.GetClientConfig(config), 0);
+
+    EXPECT_EQ(agent_.DoConnecting(), -1);
+    EXPECT_EQ(CallsStartingWith("/usr/sbin/wpa_cli -i wlan0 status"), 15);
+    EXPECT_EQ(CallsStartingWith("/usr/sbin/wpa_cli -i wlan0 terminate"), 1 + 3);
+    EXPECT_EQ(CallsStartingWith("/usr/sbin/wpa_supplicant -Dwext -i wlan0 -c "), 1);
+    EXPECT_TRUE(log_.Contains("Time out to connect AP, kill wpa_supplicant."));
+    int status = 0;
+    EXPECT_TRUE(vorn::test::WaitFor([&] { return waitpid(hung, &status, WNOHANG) == hung; }));
+    EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL);
+    EXPECT_FALSE(root_.Exists(AdapterAgentClient::PidFile("wlan0")));
+
+    // Associated: the reconnection watcher starts and DHCP gives the address.
+    root_.Scenario("wpa_cli", "when -i wlan0 status\nprint wpa_state=COMPLETED\n");
+    root_.ClearCalls();
+    EXPECT_EQ(agent_.DoConnecting(), 0);
+    EXPECT_TRUE(vorn::test::WaitFor(
+        [this] { return CallsStartingWith("/usr/sbin/wpa_cli -i wlan0 -a") == 1; }));
+    EXPECT_EQ(CallsStartingWith("/etc/rc.network restart-if wlan0"), 1);
+    EXPECT_EQ(agent_.GetStatus(config), WIFI_STATUS_ENABLED);
+
+    // A static address another host answers for is not taken; an ad-hoc network then draws one.
+    root_.Scenario("arping", "when *192.168.1.77\nexit 1\n");
+    config.stations[0].is_dhcp = false;
+    config.stations[0].ip = "192.168.1.77";
+    config.stations[0].netmask = "255.255.255.0";
+    ASSERT_EQ(agent_.GetClientConfig(config), 0);
+    EXPECT_EQ(agent_.DoConnecting(), -1);
+    EXPECT_TRUE(log_.Contains("IP [192.168.1.77] is used by other host, conflict"));
+    EXPECT_EQ(agent_.GetStatus(config), WIFI_STATUS_IPCONFLICT);
+    config.stations[0].opmode = WIFI_OPMODE_AD_HOC;
+    ASSERT_EQ(agent_.GetClientConfig(config), 0);
+    EXPECT_EQ(agent_.DoConnecting(), 0);
+    EXPECT_TRUE(log_.Contains("IP setting for adhoc failed, random generate one to use"));
+    EXPECT_THAT(root_.ReadFile("/etc/sysconfig/network-scripts/ifcfg-wlan0"),
+                ::testing::ContainsRegex("IPADDR=\"?10\\.42\\.43\\.[0-9]+"));
+    EXPECT_EQ(agent_.GetStatus(config), WIFI_STATUS_ENABLED);
+}
+
+TEST_F(AdapterAgentClientTest, LeavingClientTopologyDropsTheGatewayAndMultiGatewayRules) {
+    root_.ClearCalls();
+    EXPECT_EQ(agent_.ClientDisable(AdapterConfig()), -1);
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/stop dhcp-client IFACE=wlan0", "/sbin/iwconfig wlan0 essid off",
+                            "/sbin/ifconfig wlan0 0.0.0.0",
+                            "/usr/vorn/sbin/vornnetdtool --del-policy-route-rule -4 "
+                            "multi-gateway wlan0",
+                            "/usr/vorn/sbin/vornnetdtool --disable-route-table -4 wlan0"));
+    EXPECT_TRUE(log_.Contains("Failed to delete GatewayInfo for [wlan0]"));
+    EXPECT_TRUE(log_.Contains("Failed to refresh default gateway"));
+}
+
+TEST_F(AdapterAgentClientTest, SwitchIntoClientTopologyConnectsWithoutWaitingForItsOwnLock) {
+    Adapter::SetDriverSettleTime(std::chrono::milliseconds(0));
+    root_.Scenario("wpa_cli", "when -i wlan0 status\nprint wpa_state=COMPLETED\n");
+    Adapter::SwitchTopology(WIFI_TOPOLOGY_CLIENT);
+    {
+        std::unique_ptr<AdapterData> data(AdapterData::Create("wlan0"));
+        ASSERT_TRUE(data);
+        AdapterConfig config = data->GetConfig();
+        config.client_enabled = true;
+        config.stations = {Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "secret99")};
+        ASSERT_EQ(data->SetConfig(config), 0);
+        data->Write();
+    }
+    Adapter::SwitchTopology(WIFI_TOPOLOGY_REPEATER);
+    ASSERT_EQ(utils::WriteTopology(WIFI_TOPOLOGY_REPEATER), 0);
+
+    EXPECT_EQ(Adapter::SwitchNetTopology(WIFI_TOPOLOGY_CLIENT), 0);
+    ASSERT_NE(Adapter::GetAdapter("wlan0"), nullptr);
+    EXPECT_EQ(CallsStartingWith("/usr/sbin/wpa_supplicant -Dwext -i wlan0"), 1);
+    // The deferred restart runs once the switch has let go of the lock.
+    EXPECT_TRUE(vorn::test::WaitFor([this] {
+        return CallsStartingWith("/etc/rc.network reload-network-services") == 2 &&
+               !root_.Exists("/tmp/restart_services_pid");
+    }));
+    Adapter::DeleteAdapterAll();
+}
+
+}  // namespace
+}  // namespace wifi
+}  // namespace vornwireless
