@@ -3,8 +3,6 @@
 // for them).
 #include <dirent.h>
 
-#include <CLI/CLI.hpp>
-
 #include <algorithm>
 #include <cstdio>
 #include <functional>
@@ -12,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "common/tool_cli.h"
 #include "dbus/net_client.h"
 #include "ipv6/router/router6_factory.h"
 #include "network/route/policy_route.h"
@@ -32,10 +31,8 @@ using vornnetwork::network::PolicyRoute;
 using vornnetwork::network::PolicyRouteRule;
 using vornnetwork::network::StaticRoute;
 using vornnetwork::network::StaticRouteRule;
-using vornwireless::utils::CompactJson;
 using vornwireless::utils::ConfigSection;
 using vornwireless::utils::ParseJson;
-using vornwireless::utils::StyledJson;
 
 // How a command's argument becomes the method's argument.
 enum class Argument {
@@ -434,7 +431,7 @@ int RunRouteCommand(const RouteCommand& command, const std::vector<std::string>&
         return 1;
     }
     if (!data.isNull()) {
-        std::printf("%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
+        vorn::tools::PrintJson(data, compact);
     }
     return 0;
 }
@@ -457,21 +454,6 @@ bool BuildRequest(const Command& command, const std::string& text, Json::Value& 
     return ParseJson(text, request) && request.isObject();
 }
 
-int ExitStatus(int result) {
-    if (result >= 0) {
-        return 0;
-    }
-    return result < -125 ? 125 : -result;
-}
-
-// Shows each option's operands as written in the tables, nothing added.
-class OperandFormatter : public CLI::Formatter {
-  public:
-    std::string make_option_opts(const CLI::Option* option) const override {
-        return option->get_type_name().empty() ? "" : " " + option->get_type_name();
-    }
-};
-
 // Calls one method of the service; the exit status.
 int RunServiceCommand(const Command& command, const std::string& text, bool compact) {
     Json::Value request;
@@ -485,10 +467,10 @@ int RunServiceCommand(const Command& command, const std::string& text, bool comp
     const int result = command.call(client, text, request, data);
     if (result < 0) {
         std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command.option, result);
-        return ExitStatus(result);
+        return vorn::tools::ExitStatus(result);
     }
     if (command.hasAnswer) {
-        std::printf("%s", compact ? (CompactJson(data) + "\n").c_str() : StyledJson(data).c_str());
+        vorn::tools::PrintJson(data, compact);
     }
     return 0;
 }
@@ -496,11 +478,9 @@ int RunServiceCommand(const Command& command, const std::string& text, bool comp
 }  // namespace
 
 int main(int argc, char** argv) {
-    CLI::App app{kDescription, "vornnetdtool"};
-    app.set_version_flag("--version", "vornnetdtool 5.0.0");
+    CLI::App app{kDescription};
+    vorn::tools::SetUpApp(app, "vornnetdtool", "5.0.0");
     app.footer(kFooter);
-    app.formatter(std::make_shared<OperandFormatter>());
-    app.get_formatter()->column_width(40);
     bool compact = false;
     bool ready = false;
     app.add_flag("--compact", compact, "print the answer on one line");
@@ -527,16 +507,9 @@ int main(int argc, char** argv) {
                                                    static_cast<int>(command.maxWords));
         routeOptions.push_back(option->group("Route commands (run here, not in vornnetd)"));
     }
-    try {
-        app.parse(argc, argv);
-    } catch (const CLI::Success& e) {
-        return app.exit(e);
-    } catch (const CLI::ParseError& e) {
-        std::fprintf(stderr,
-                     "vornnetdtool: unknown command or wrong arguments: %s\n"
-                     "Run with --help for the commands.\n",
-                     e.what());
-        return 2;
+    int status = 0;
+    if (!vorn::tools::ParseCommandLine(app, argc, argv, "vornnetdtool", status)) {
+        return status;
     }
     const auto given = [](const std::vector<const CLI::Option*>& options) {
         return std::count_if(options.begin(), options.end(),
@@ -546,15 +519,7 @@ int main(int argc, char** argv) {
         std::fprintf(stderr, "vornnetdtool: give exactly one command (--help lists them)\n");
         return 2;
     }
-    vorn::platform::PrefixPathWithRoot();
-    // The library's failure lines (the service's error text among them) are the user's answer.
-    openlog("vornnetdtool", LOG_PID, LOG_USER);
-    vorn::log::SetSink([](int priority, const std::string& line) {
-        vorn::log::SyslogSink(priority, line);
-        if (priority <= LOG_WARNING) {
-            std::fprintf(stderr, "vornnetdtool: %s\n", line.c_str());
-        }
-    });
+    vorn::tools::SendLogToStderr("vornnetdtool");
     if (ready) {
         const bool up = NetClient().IsServerReady();
         std::printf("%s\n", up ? "ready" : "not ready");
