@@ -373,7 +373,8 @@ int AdapterAgentClient::DoConnecting() {
         VORN_LOG(LOG_ERR, "Failed to set WPA Supplicant Config file");
         return -1;
     }
-    if (QLIBCFileExist(PidFile(name).c_str()) == 1 && TerminateWpa() != 0) {
+    // A pid file left by a supplicant that died is no reason to fail: the new one replaces it.
+    if (SupplicantPid() != 0 && TerminateWpa() != 0) {
         VORN_LOG(LOG_ERR, "Failed to termiante wpa process");
         return -1;
     }

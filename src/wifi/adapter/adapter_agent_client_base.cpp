@@ -1,5 +1,6 @@
 #include "wifi/adapter/adapter_agent_client_base.h"
 
+#include <dirent.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -7,6 +8,7 @@
 #include <cstring>
 #include <random>
 #include <thread>
+#include <vector>
 
 #include "platform/qlib_net.h"
 #include "platform/qlibc_file.h"
@@ -15,6 +17,7 @@
 #include "platform/text_file.h"
 #include "platform/vorn_net.h"
 #include "utils/dbus_client.h"
+#include "utils/decimal.h"
 #include "utils/interface_name.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
@@ -50,8 +53,30 @@ bool IsSet(const char* key, const char* file) {
            std::strcmp(value, "yes") == 0;
 }
 
+// The worker must not keep the daemon's bus connection or locked pid file open once the
+// daemon itself is gone.
+void CloseInheritedFiles() {
+    DIR* dir = opendir("/proc/self/fd");
+    if (dir == nullptr) {
+        return;
+    }
+    std::vector<int> open;
+    while (const dirent* entry = readdir(dir)) {
+        int fd = -1;
+        if (vornwireless::utils::ParseDecimal(entry->d_name, fd) && fd > STDERR_FILENO &&
+            fd != dirfd(dir)) {
+            open.push_back(fd);
+        }
+    }
+    closedir(dir);
+    for (const int fd : open) {
+        close(fd);
+    }
+}
+
 // The restart itself, in the child: waits out a topology switch, then restarts.
 int WaitAndRestartServices() {
+    CloseInheritedFiles();
     if (QLIBCFileExist(kTopologyLock) == 1) {
         VORN_LOG(LOG_ERR, "service restart locked by other wait...");
         for (int poll = 0; poll < kLockWaitPolls && QLIBCFileExist(kTopologyLock) == 1; ++poll) {
