@@ -237,6 +237,11 @@ int AdapterAgentClientBase::SetupAddress() {
 
 int AdapterAgentClientBase::UseAddress(const std::string& ip, const std::string& netmask,
                                        const std::string& gateway) {
+    if (vornwireless::utils::IPAddress(ip).IsEmpty()) {
+        VORN_LOG(LOG_ERR, "No static IP to set on [%s]", GetName().c_str());
+        ipStatus_ = WIFI_STATUS_IPFAILED;
+        return -1;
+    }
     if (!IsAddressFree(ip)) {
         VORN_LOG(LOG_ERR, "IP [%s] is used by other host, conflict", ip.c_str());
         ipStatus_ = WIFI_STATUS_IPCONFLICT;
@@ -281,11 +286,8 @@ int AdapterAgentClientBase::UseRandomAdHocAddress() {
 
 // An answer, or an arping that cannot tell, both keep the address unused.
 bool AdapterAgentClientBase::IsAddressFree(const std::string& ip) const {
-    if (vornwireless::utils::IPAddress(ip).IsEmpty() || !IsNameValid()) {
-        return false;
-    }
-    return QLIBCExecl(kArping, kQuietFlags, "-D", "-q", "-c", "2", "-w", "3", "-I",
-                      GetName().c_str(), ip.c_str(), nullptr) == 0;
+    return IsNameValid() && QLIBCExecl(kArping, kQuietFlags, "-D", "-q", "-c", "2", "-w", "3", "-I",
+                                       GetName().c_str(), ip.c_str(), nullptr) == 0;
 }
 
 int AdapterAgentClientBase::RemoveGateway() const {
