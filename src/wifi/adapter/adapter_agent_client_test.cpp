@@ -10,6 +10,7 @@
 
 #include "support/sim_root.h"
 #include "wifi/adapter/adapter.h"
+#include "wifi/utils/station_utils.h"
 
 extern char** environ;
 
@@ -194,13 +195,23 @@ TEST_F(AdapterAgentClientTest, ConnectGivesUpAfterFifteenPollsAndThenAddressesAr
     EXPECT_FALSE(root_.Exists(AdapterAgentClient::PidFile("wlan0")));
 
     // Associated: the reconnection watcher starts and DHCP gives the address.
-    root_.Scenario("wpa_cli", "when -i wlan0 status\nprint wpa_state=COMPLETED\n");
+    root_.Scenario("wpa_cli",
+                   "when -i wlan0 status\nprint bssid=02:00:00:00:00:01\n"
+                   "print ssid=home\nprint wpa_state=COMPLETED\n"
+                   "print ip_address=192.168.1.50\n");
     root_.ClearCalls();
     EXPECT_EQ(agent_.DoConnecting(), 0);
     EXPECT_TRUE(vorn::test::WaitFor(
         [this] { return CallsStartingWith("/usr/sbin/wpa_cli -i wlan0 -a") == 1; }));
     EXPECT_EQ(CallsStartingWith("/etc/rc.network restart-if wlan0"), 1);
     EXPECT_EQ(agent_.GetStatus(config), WIFI_STATUS_ENABLED);
+    config.name = "wlan0";
+    Json::Value info;
+    ASSERT_EQ(utils::GetConnectedAPInfo(config, info), 0);
+    EXPECT_EQ(info["essid"], "home");
+    EXPECT_EQ(info["security"], "PERSONAL_WPA2");
+    EXPECT_EQ(info["ip"], "192.168.1.50");
+    EXPECT_EQ(info["password"], "");
 
     // A static address another host answers for is not taken; an ad-hoc network then draws one.
     root_.Scenario("arping", "when *192.168.1.77\nexit 1\n");
