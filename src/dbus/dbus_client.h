@@ -39,6 +39,9 @@ class DBusClient {
 
   protected:
     DBusBusType GetBusType() const { return bus_; }
+    // A reply is held: the last blocking SendMessage got one (an error reply is none), and it was
+    // not read yet.
+    bool HasReply() const { return reply_ != nullptr; }
 
   private:
     void DropMessage();

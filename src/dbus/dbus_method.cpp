@@ -2,6 +2,8 @@
 
 #include <utility>
 
+#include "utils/log.h"
+
 namespace vornwireless {
 namespace dbus {
 
@@ -37,6 +39,16 @@ DBusMethod::DBusMethod(const char* name, InIn handler)
                  [handler](GObject* o, const std::vector<const char*>& a, char**, GError** e) {
                      return handler(o, a[0], a[1], e);
                  }) {}
+
+void SetHandlerError(GError** error, const char* domain, const char* text) {
+    g_set_error_literal(error, g_quark_from_static_string(domain), 1, text);
+}
+
+gboolean BadParameter(GError** error) {
+    VORN_LOG(LOG_ERR, "Bad parameter");
+    SetHandlerError(error, "badparameter", "Bad parameter");
+    return FALSE;
+}
 
 }  // namespace dbus
 }  // namespace vornwireless

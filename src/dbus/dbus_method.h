@@ -47,6 +47,11 @@ class DBusMethod {
     Invoker invoke_;
 };
 
+// Sets a handler's error: code 1 in the domain quark ("badparameter" or "error"), text as given.
+void SetHandlerError(GError** error, const char* domain, const char* text);
+// A null object or argument: logs and answers "Bad parameter"; FALSE.
+gboolean BadParameter(GError** error);
+
 }  // namespace dbus
 }  // namespace vornwireless
 

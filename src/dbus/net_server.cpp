@@ -16,19 +16,11 @@ using vornnetwork::network::module::MODULE_IPV6;
 using vornnetwork::network::module::MODULE_ROUTE;
 using vornnetwork::network::module::MODULE_TYPE;
 using vornnetwork::network::module::ModuleManager;
+using vornwireless::dbus::BadParameter;
+using vornwireless::dbus::SetHandlerError;
 
 constexpr const char* kName = "com.tessarin.net";
 constexpr const char* kPath = "/";
-
-void SetError(GError** error, const char* domain, const char* text) {
-    g_set_error_literal(error, g_quark_from_static_string(domain), 1, text);
-}
-
-gboolean BadParameter(GError** error) {
-    VORN_LOG(LOG_ERR, "Bad parameter");
-    SetError(error, "badparameter", "Bad parameter");
-    return FALSE;
-}
 
 // Where one method goes: the request's "method", the module, and its failure texts (the log's and
 // the error reply's).
@@ -44,7 +36,7 @@ gboolean Forward(const Route& route, Json::Value& request, char** data, GError**
     ModuleManager* manager = ModuleManager::GetInstance();
     if (manager == nullptr) {
         VORN_LOG(LOG_ERR, "failed to get network manager");
-        SetError(error, "error", "failed to get network manager");
+        SetHandlerError(error, "error", "failed to get network manager");
         return FALSE;
     }
     request["method"] = route.method;
@@ -62,7 +54,7 @@ gboolean Forward(const Route& route, Json::Value& request, char** data, GError**
         if (answer.isObject() && answer["error"].isString()) {
             text += ": " + answer["error"].asString();
         }
-        SetError(error, "error", text.c_str());
+        SetHandlerError(error, "error", text.c_str());
         return FALSE;
     }
     if (data != nullptr) {

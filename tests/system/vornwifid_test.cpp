@@ -1,0 +1,322 @@
+// vornwifid as a process on a private session bus, over a fresh simulated root (router topology,
+// wlan0 in the fake sysfs) with vornnetd beside it for the bridges' gateway records; needs no root.
+#include <gio/gio.h>
+#include <gmock/gmock.h>
+#include <signal.h>
+
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "dbus/wifi_client.h"
+#include "support/log_capture.h"
+#include "support/private_bus.h"
+#include "support/sim_root.h"
+#include "utils/json_text.h"
+
+namespace vorn {
+namespace test {
+namespace {
+
+using ::testing::AllOf;
+using ::testing::HasSubstr;
+using Timeout = DaemonProcess::Timeout;
+
+constexpr char kVornwifid[] = VORN_BINARY_DIR "/daemons/vornwifid";
+constexpr char kVornnetd[] = VORN_BINARY_DIR "/daemons/vornnetd";
+constexpr char kService[] = "com.tessarin.wifi";
+constexpr char kHookDir[] = "/etc/vorn/plugins/net/topology_change.d";
+constexpr Timeout kStartTimeout{60000};
+constexpr Timeout kCallTimeout{30000};
+constexpr Timeout kExitTimeout{20000};
+
+// The outcome of one call: the reply's text, or the error reply's own message.
+struct Answer {
+    bool ok = false;
+    std::string text;
+};
+
+// One call through GIO, parameters being a floating GVariant tuple of strings.
+Answer Call(const char* method, GVariant* parameters) {
+    Answer answer;
+    GError* error = nullptr;
+    GDBusConnection* bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, &error);
+    if (bus == nullptr) {
+        g_variant_unref(g_variant_ref_sink(parameters));
+        answer.text = error->message;
+        g_error_free(error);
+        return answer;
+    }
+    GVariant* reply = g_dbus_connection_call_sync(
+        bus, kService, "/", kService, method, parameters, nullptr, G_DBUS_CALL_FLAGS_NONE,
+        static_cast<int>(kCallTimeout.count()), nullptr, &error);
+    g_object_unref(bus);
+    answer.ok = reply != nullptr;
+    if (reply == nullptr) {
+        g_dbus_error_strip_remote_error(error);
+        answer.text = error->message;
+        g_error_free(error);
+    } else {
+        if (g_variant_is_of_type(reply, G_VARIANT_TYPE("(s)"))) {
+            const char* text = nullptr;
+            g_variant_get(reply, "(&s)", &text);
+            answer.text = text;
+        }
+        g_variant_unref(reply);
+    }
+    return answer;
+}
+
+Answer Call(const char* method) {
+    return Call(method, g_variant_new("()"));
+}
+Answer Call(const char* method, const std::string& a) {
+    return Call(method, g_variant_new("(s)", a.c_str()));
+}
+Answer Call(const char* method, const std::string& a, const std::string& b) {
+    return Call(method, g_variant_new("(ss)", a.c_str(), b.c_str()));
+}
+
+Json::Value Parsed(const Answer& answer) {
+    Json::Value value;
+    EXPECT_TRUE(vornwireless::utils::ParseJson(answer.text, value, 1 << 24)) << answer.text;
+    return value;
+}
+
+std::string Compact(const Json::Value& value) {
+    return vornwireless::utils::CompactJson(value);
+}
+
+// Every regular file of the root with its content, the simulator's own records left out.
+std::map<std::string, std::string> Files(const SimRoot& root) {
+    std::map<std::string, std::string> files;
+    for (const auto& entry : std::filesystem::recursive_directory_iterator(root.Dir())) {
+        const std::string logical = entry.path().string().substr(root.Dir().size());
+        if (entry.is_regular_file() && !entry.is_symlink() && logical.rfind("/.vornsim", 0) != 0) {
+            files[logical] = root.ReadFile(logical);
+        }
+    }
+    return files;
+}
+
+class VornwifidTest : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        ASSERT_TRUE(bus_.Started());
+        ASSERT_TRUE(netd_.WaitForBusName("com.tessarin.net", kStartTimeout)) << netd_.Stderr();
+        // What the radio reports, the kernel files the simulated brctl does not make, and an
+        // address br0 can take over from eth0.
+        root_.WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth0",
+                        "DEVICE=eth0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
+        root_.Scenario("iwconfig", "when wlan0*\nprint wlan0     IEEE 802.11bgn  ESSID:off/any\n");
+        for (const char* bridge : {"lbr0", "br0"}) {
+            root_.WriteFile(std::string("/proc/sys/net/ipv6/conf/") + bridge + "/disable_ipv6",
+                            "0\n");
+        }
+    }
+    void Start() {
+        wifid_ =
+            std::make_unique<DaemonProcess>(std::vector<std::string>{kVornwifid, "--foreground"});
+        ASSERT_TRUE(wifid_->WaitForBusName(kService, kStartTimeout)) << wifid_->Stderr();
+    }
+    void ExpectServing() {
+        EXPECT_EQ(Call("GetAdapterList").text.find("wlan0") != std::string::npos, true);
+        EXPECT_TRUE(wifid_->Running()) << wifid_->Stderr();
+    }
+
+    LogCapture log_;
+    PrivateBus bus_;
+    SimRoot root_;
+    DaemonProcess netd_{{kVornnetd, "--foreground"}};
+    std::unique_ptr<DaemonProcess> wifid_;
+};
+
+TEST_F(VornwifidTest, ServesEveryMethodThroughTheBusAndTheClient) {
+    root_.WriteFile(std::string(kHookDir) + "/record",
+                    "#!/bin/sh\necho \"$PLUGIN_ACTION $OLD_TOPOLOGY $NEW_TOPOLOGY\" >> "
+                    "\"$VORN_ROOT/tmp/hooks\"\n");
+    std::filesystem::permissions(root_.Path(std::string(kHookDir) + "/record"),
+                                 std::filesystem::perms::owner_all);
+    ASSERT_NO_FATAL_FAILURE(Start());
+    vornwireless::dbus::WifiClient client;
+    EXPECT_TRUE(client.IsServerReady());
+
+    // What the daemon found at start: the router topology's bridge and the radio.
+    Json::Value value;
+    ASSERT_EQ(client.GetAdapterList(value), 0);
+    EXPECT_EQ(Compact(value), R"(["wlan0"])");
+    Json::Value config;
+    ASSERT_EQ(client.GetAdapterConfig("wlan0", config), 0);
+    EXPECT_EQ(config["name"].asString(), "wlan0");
+    ASSERT_EQ(client.GetAdapterCapability("wlan0", value), 0);
+    EXPECT_TRUE(value["topology"].isArray()) << value;
+    ASSERT_EQ(client.GetAdapterStatus("wlan0", value), 0);
+    EXPECT_TRUE(value["status"].isString());
+    ASSERT_EQ(client.GetBridgeList(value), 0);
+    ASSERT_EQ(value.size(), 1u) << value;
+    EXPECT_EQ(value[0]["ifname"].asString(), "lbr0");
+    Json::Value bridge;
+    ASSERT_EQ(client.GetBridgeConfig("lbr0", bridge), 0);
+    EXPECT_EQ(bridge, value[0]);
+    EXPECT_EQ(client.GetConnectionList("wlan0", value), 0);
+    EXPECT_TRUE(value.isArray());
+
+    // An error reply is a failure even when its first number reads 0.
+    EXPECT_EQ(client.GetAdapterConfig("wlan0x", value), -1);
+    EXPECT_EQ(client.GetAdapterStatus("wlan7", value), -7);
+    EXPECT_EQ(client.EnableAdapter("nowhere"), -1);
+
+    // Changes reach the access point's files and the bridge.
+    config["ssid"] = "Vorn Test";
+    EXPECT_EQ(client.ApplyAdapter("wlan0", config), 0) << wifid_->Stderr();
+    EXPECT_THAT(root_.ReadFile("/etc/hostapd/hostapd-wlan0-host.conf"),
+                HasSubstr("ssid=Vorn Test"));
+    EXPECT_EQ(client.ApplyBridge("lbr0", bridge), 0);
+    EXPECT_EQ(client.DisableAdapter("wlan0"), 0);
+    EXPECT_EQ(client.EnableAdapter("wlan0"), 0);
+    EXPECT_EQ(client.ExecSchedule("wlan0"), -1);  // no schedule enabled
+    EXPECT_TRUE(log_.Contains("Failed to execute schedule(wlan0) (0)"));
+    EXPECT_EQ(client.EnableWPSWithPBC("wlan0"), 0);
+    EXPECT_EQ(client.EnableWPSWithPinCode("wlan0", "12345670"), 0);
+    EXPECT_EQ(client.SwitchAdapterTopology("wlan0", "router"), 0);
+    EXPECT_EQ(client.RefreshWlanSlaveList(), 0);
+    EXPECT_EQ(client.SwitchWifiOnOff(), 0);
+    EXPECT_EQ(client.SwitchWifiOnOff(), 0);
+    // An access point scans for nothing.
+    ASSERT_EQ(client.ScanNetworks("wlan0", value), 0);
+    EXPECT_EQ(Compact(value), "[]");
+    // Nor is it joined to one.
+    EXPECT_EQ(Call("GetConnectedAPInfo", "wlan0").text,
+              "Failed to load connected AP info for interface(wlan0)");
+
+    // The whole appliance's topology, with the hooks before and after.
+    EXPECT_EQ(client.SwitchTopology("bridge"), 0) << wifid_->Stderr();
+    EXPECT_EQ(root_.ReadFile("/tmp/hooks"), "4 router bridge\n5 router bridge\n");
+    ASSERT_EQ(client.GetBridgeList(value), 0);
+    EXPECT_EQ(value[0]["ifname"].asString(), "br0") << value;
+
+    // The adapter list emptied, refilled from sysfs (the one 10 s loop is never reached here).
+    EXPECT_EQ(client.ForceRemoveAllAdapters(), 0);
+    ASSERT_EQ(client.GetAdapterList(value), 0);
+    EXPECT_EQ(Compact(value), "[]");
+    EXPECT_EQ(client.RefreshAdapterList(), 0);
+    EXPECT_EQ(client.RemoveAdapter("wlan0"), 0);
+    EXPECT_EQ(client.AddAdapter("wlan0"), 0);
+    EXPECT_EQ(client.ResetToDefault(), 0);
+    ExpectServing();
+}
+
+TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
+    ASSERT_NO_FATAL_FAILURE(Start());
+    const Json::Value config = Parsed(Call("GetAdapterConfig", "wlan0"));
+    const Json::Value bridge = Parsed(Call("GetBridgeConfig", "lbr0"));
+    const auto before = Files(root_);
+
+    const std::map<std::string, std::string> unknownAdapter = {
+        {"GetAdapterConfig", "Adapter is not found(wlan9)"},
+        {"GetAdapterCapability", "Adapter is not found(wlan9)"},
+        {"GetAdapterStatus", "Adapter is not found(wlan9)"},
+        {"EnableAdapter", "Adapter is not found(wlan9)"},
+        {"DisableAdapter", "Adapter is not found(wlan9)"},
+        {"ExecSchedule", "Adapter is not found(wlan9)"},
+        {"GetConnectionList", "Adapter is not found(wlan9)"},
+        {"GetConnectedAPInfo", "Failed to get adapter for interface(wlan9)"},
+        {"ScanNetworks", "Failed to get adapter for interface(wlan9)"},
+        {"EnableWPSWithPBC", "Failed to get adapter for interface(wlan9)"},
+        {"GetBridgeConfig", "Bridge is not found(wlan9)"},
+        {"RemoveAdapter", "Failed to remove adapter(wlan9)"},
+        {"AddAdapter", "Failed to add adapter(wlan9)"},
+    };
+    for (const auto& [method, error] : unknownAdapter) {
+        const Answer answer = Call(method.c_str(), "wlan9");
+        EXPECT_FALSE(answer.ok) << method;
+        EXPECT_EQ(answer.text, error) << method;
+    }
+    EXPECT_EQ(Call("ApplyAdapter", "wlan9", "{}").text, "Adapter is not found(wlan9)");
+    EXPECT_EQ(Call("ApplyBridge", "wlan9", "{}").text, "Bridge is not found(wlan9)");
+    EXPECT_EQ(Call("SwitchAdapterTopology", "wlan9", "router").text, "Adapter is not found(wlan9)");
+    EXPECT_EQ(Call("EnableWPSWithPinCode", "wlan9", "1234").text,
+              "Failed to get adapter for interface(wlan9)");
+    EXPECT_EQ(Call("SwitchTopology", "mesh\nrouter").text,
+              "Failed to switch topology(mesh\nrouter)");
+    EXPECT_EQ(Call("SwitchAdapterTopology", "wlan0", "error").text,
+              "Failed to switch topology(wlan0)");
+    EXPECT_EQ(Call("EnableWPSWithPinCode", "wlan0", "12;reboot").text,
+              "Failed to enable wps pin code (wlan0)(12;reboot)");
+
+    // Configurations that are not JSON, have the wrong types, nest too deep, or would break a
+    // line of the access point's file.
+    std::string deep = "1" + std::string(10000, '}');
+    for (int i = 0; i < 10000; ++i) {
+        deep.insert(0, R"({"a":)");
+    }
+    Json::Value wrongTypes = config;
+    wrongTypes["channel"] = "six";
+    wrongTypes["enabled"] = "yes";
+    Json::Value newline = config;
+    newline["ssid"] = "Vorn\nctrl_interface=/tmp";
+    Json::Value badBridge = bridge;
+    badBridge["dhcp_enabled"] = "yes";
+    badBridge["slave_list"] = Json::Value(7);
+    const std::vector<std::string> adapterInputs = {"not json", deep, "[]", Compact(wrongTypes),
+                                                    Compact(newline)};
+    for (const std::string& input : adapterInputs) {
+        EXPECT_EQ(Call("ApplyAdapter", "wlan0", input).text, "Failed to get config(wlan0)")
+            << input.substr(0, 60);
+    }
+    for (const std::string& input : {std::string("not json"), deep, Compact(badBridge)}) {
+        EXPECT_EQ(Call("ApplyBridge", "lbr0", input).text, "Failed to get config(lbr0)")
+            << input.substr(0, 60);
+    }
+    EXPECT_EQ(Call("ApplyAdapter", "wlan0", "{}").text, "Failed to get config(wlan0)");
+    ExpectServing();
+    const auto after = Files(root_);
+    for (const auto& [file, content] : after) {
+        EXPECT_EQ(content, before.count(file) != 0 ? before.at(file) : "(none)") << file;
+    }
+    EXPECT_EQ(after.size(), before.size());
+}
+
+TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
+    // A radio that is on, with a week's table that says off at every hour.
+    ASSERT_NO_FATAL_FAILURE(Start());
+    Json::Value config = Parsed(Call("GetAdapterConfig", "wlan0"));
+    config["enabled"] = true;
+    config["schedule_enabled"] = true;
+    config["schedule"] = std::string(168, '0');
+    ASSERT_EQ(vornwireless::dbus::WifiClient().ApplyAdapter("wlan0", config), 0);
+    ASSERT_TRUE(wifid_->Signal(SIGTERM));
+    EXPECT_EQ(wifid_->WaitForExit(kExitTimeout), 0) << wifid_->Stderr();
+    EXPECT_THAT(wifid_->Stderr(), AllOf(HasSubstr("Stopping on signal"), HasSubstr("Stopped")));
+    EXPECT_FALSE(root_.Exists("/var/run/vornwifid.pid"));
+    EXPECT_FALSE(vornwireless::dbus::WifiClient().IsServerReady());
+
+    // What an interrupted topology switch leaves: its lock and a frozen event daemon.
+    root_.WriteFile("/tmp/topology.lock", "");
+    DaemonProcess evmond({"sleep", "300"});
+    ASSERT_TRUE(evmond.Signal(SIGSTOP));
+    root_.WriteFile("/var/run/evmond.pid", std::to_string(evmond.Pid()) + "\n");
+    ASSERT_NO_FATAL_FAILURE(Start());
+    EXPECT_FALSE(root_.Exists("/tmp/topology.lock"));
+    std::ifstream stat("/proc/" + std::to_string(evmond.Pid()) + "/stat");
+    std::string pid, name, state;
+    stat >> pid >> name >> state;
+    EXPECT_NE(state, "T");
+    EXPECT_FALSE(Parsed(Call("GetAdapterConfig", "wlan0"))["enabled"].asBool());
+
+    DaemonProcess second({kVornwifid, "--foreground"});
+    EXPECT_EQ(second.WaitForExit(kExitTimeout), 1);
+    EXPECT_THAT(second.Stderr(), HasSubstr("another vornwifid is running"));
+    EXPECT_EQ(root_.ReadFile("/var/run/vornwifid.pid"), std::to_string(wifid_->Pid()) + "\n");
+    std::string out;
+    EXPECT_EQ(RunProgram({kVornwifid, "--help"}, kExitTimeout, &out), 0);
+    EXPECT_THAT(out, AllOf(HasSubstr("Usage: vornwifid"), HasSubstr("--foreground")));
+    ExpectServing();
+}
+
+}  // namespace
+}  // namespace test
+}  // namespace vorn
