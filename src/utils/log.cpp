@@ -1,5 +1,7 @@
 #include "utils/log.h"
 
+#include <pthread.h>
+
 #include <cstdarg>
 #include <cstdio>
 #include <mutex>
@@ -12,6 +14,10 @@ namespace {
 
 std::mutex& SinkMutex() {
     static std::mutex mutex;
+    // A child forked while another thread logs would find the lock held for ever.
+    static const int forkSafe =
+        pthread_atfork([] { mutex.lock(); }, [] { mutex.unlock(); }, [] { mutex.unlock(); });
+    static_cast<void>(forkSafe);
     return mutex;
 }
 

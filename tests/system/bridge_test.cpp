@@ -56,6 +56,7 @@ class BridgeSystemTest : public vorn::test::PeerNamespaceTest {
     }
 
     void TearDown() override {
+        Adapter::DeleteAdapterAll();
         BridgeBase::ClearBridgeList();
         if (loop_.joinable()) {
             server_->QuitLoop();
