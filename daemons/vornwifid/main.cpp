@@ -5,10 +5,10 @@
 #include <sys/timerfd.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <chrono>
 #include <cstdint>
 #include <cstdio>
-#include <cstring>
 #include <string>
 #include <thread>
 
@@ -16,8 +16,8 @@
 #include "dbus/wifi_server.h"
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
-#include "utils/create_pid_file.h"
 #include "utils/log.h"
+#include "utils/service_daemon.h"
 #include "wifi/adapter/adapter.h"
 #include "wifi/bridge/bridge_base.h"
 
@@ -25,26 +25,15 @@ namespace {
 
 using vornwireless::wifi::Adapter;
 
-constexpr const char* kPidFile = "/var/run/vornwifid.pid";
 constexpr const char* kTopologyLock = "/tmp/topology.lock";
 constexpr const char* kEventDaemonPidFile = "/var/run/evmond.pid";
 constexpr std::chrono::seconds kNetServiceWait{10};
 constexpr std::chrono::milliseconds kNetServicePoll{250};
 
-void Usage(FILE* out) {
-    std::fprintf(
-        out,
-        "Usage: vornwifid [--foreground] [--help] [--version]\n"
-        "The wifi daemon of the Vorn appliance: brings up the bridges and wireless adapters\n"
-        "of the stored network topology and serves their requests as \"com.tessarin.wifi\"\n"
-        "at \"/\" on the session bus. Needs vornnetd for the bridges' gateway records.\n"
-        "\n"
-        "  --foreground  stay attached and copy log lines to stderr\n"
-        "  --help        show this text\n"
-        "  --version     show the version\n"
-        "\n"
-        "Stops on SIGTERM or SIGINT. Paths and programs live under $VORN_ROOT when set.\n");
-}
+constexpr const char* kDescription =
+    "The wifi daemon of the Vorn appliance: brings up the bridges and wireless adapters\n"
+    "of the stored network topology and serves their requests as \"com.tessarin.wifi\"\n"
+    "at \"/\" on the session bus. Needs vornnetd for the bridges' gateway records.\n";
 
 gboolean OnStopSignal(gpointer server) {
     VORN_LOG(LOG_INFO, "Stopping on signal");
@@ -124,38 +113,10 @@ void StartWifi() {
 }  // namespace
 
 int main(int argc, char** argv) {
-    bool foreground = false;
-    for (int i = 1; i < argc; ++i) {
-        if (std::strcmp(argv[i], "--foreground") == 0) {
-            foreground = true;
-        } else if (std::strcmp(argv[i], "--help") == 0) {
-            Usage(stdout);
-            return 0;
-        } else if (std::strcmp(argv[i], "--version") == 0) {
-            std::printf("vornwifid 5.0.0\n");
-            return 0;
-        } else {
-            std::fprintf(stderr, "vornwifid: unknown argument '%s'\n", argv[i]);
-            Usage(stderr);
-            return 2;
-        }
-    }
-
-    openlog("vornwifid", LOG_PID, LOG_DAEMON);
-    if (foreground) {
-        vorn::log::SetSink(vorn::log::SyslogAndStderrSink);
-    } else if (daemon(0, 0) != 0) {
-        std::perror("vornwifid: daemon");
-        return 1;
-    }
-    signal(SIGPIPE, SIG_IGN);
-    vorn::platform::PrefixPathWithRoot();
-
-    const int pidFile = vornwireless::utils::CreatePidFile(kPidFile);
-    if (pidFile < 0) {
-        std::fprintf(stderr, "vornwifid: cannot take %s: another vornwifid is running\n", kPidFile);
-        VORN_LOG(LOG_ERR, "Another instance holds %s", kPidFile);
-        return 1;
+    vornwireless::utils::ServiceDaemon service("vornwifid", kDescription);
+    const int status = service.Start(argc, argv);
+    if (status >= 0) {
+        return status;
     }
 
     StartWifi();
@@ -163,25 +124,22 @@ int main(int argc, char** argv) {
     vornwireless::dbus::WifiServer server;
     if (!server.IsInitialized()) {
         std::fprintf(stderr, "vornwifid: cannot serve com.tessarin.wifi on the session bus\n");
-        unlink(vorn::platform::RootPath(kPidFile).c_str());
         return 1;
     }
-    const int clock = timerfd_create(CLOCK_REALTIME, TFD_NONBLOCK | TFD_CLOEXEC);
-    if (clock < 0 || !ArmClockJumpTimer(clock)) {
+    const int clockTimer = timerfd_create(CLOCK_REALTIME, TFD_NONBLOCK | TFD_CLOEXEC);
+    if (clockTimer < 0 || !ArmClockJumpTimer(clockTimer)) {
         VORN_LOG(LOG_ERR, "Failed to watch the wall clock");
     } else {
-        g_unix_fd_add(clock, G_IO_IN, OnClockJump, nullptr);
+        g_unix_fd_add(clockTimer, G_IO_IN, OnClockJump, nullptr);
     }
     g_unix_signal_add(SIGTERM, OnStopSignal, &server);
     g_unix_signal_add(SIGINT, OnStopSignal, &server);
     VORN_LOG(LOG_INFO, "Serving com.tessarin.wifi");
     server.StartLoop();
 
-    if (clock >= 0) {
-        close(clock);
+    if (clockTimer >= 0) {
+        close(clockTimer);
     }
-    unlink(vorn::platform::RootPath(kPidFile).c_str());
-    close(pidFile);
     VORN_LOG(LOG_INFO, "Stopped");
     return 0;
 }
