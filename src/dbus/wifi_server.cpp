@@ -83,6 +83,29 @@ gboolean RunOnAdapter(GObject* object, const char* ifname, GError** error,
     return TRUE;
 }
 
+// Runs an operation of the adapter list on one interface name.
+gboolean RunOnName(GObject* object, const char* ifname, GError** error,
+                   int (*operation)(const std::string&), const char* failureFormat) {
+    if (object == nullptr || ifname == nullptr) {
+        return BadParameter(error);
+    }
+    if (operation(ifname) != 0) {
+        return WIFI_FAIL(error, failureFormat, ifname);
+    }
+    return TRUE;
+}
+
+// Runs an operation of every adapter; failure is the whole error text.
+gboolean RunOnAll(GObject* object, GError** error, int (*operation)(), const char* failure) {
+    if (object == nullptr) {
+        return BadParameter(error);
+    }
+    if (operation() != 0) {
+        return WIFI_FAIL(error, "%s", failure);
+    }
+    return TRUE;
+}
+
 // Runs refresh until it finds something, fails, or kRefreshLimit passes (giving up is success).
 gboolean RefreshUntilFound(GObject* object, GError** error, int (*refresh)(), const char* logFormat,
                            const char* errorFormat) {
@@ -279,23 +302,12 @@ gboolean wifi_switch_adapter_topology(GObject* object, const char* ifname, const
 }
 
 gboolean wifi_add_adapter(GObject* object, const char* ifname, GError** error) {
-    if (object == nullptr || ifname == nullptr) {
-        return BadParameter(error);
-    }
-    if (Adapter::AddAdapter(ifname) != 0) {
-        return WIFI_FAIL(error, "Failed to add adapter(%s)", ifname);
-    }
-    return TRUE;
+    return RunOnName(object, ifname, error, &Adapter::AddAdapter, "Failed to add adapter(%s)");
 }
 
 gboolean wifi_remove_adapter(GObject* object, const char* ifname, GError** error) {
-    if (object == nullptr || ifname == nullptr) {
-        return BadParameter(error);
-    }
-    if (Adapter::RemoveAdapter(ifname) != 0) {
-        return WIFI_FAIL(error, "Failed to remove adapter(%s)", ifname);
-    }
-    return TRUE;
+    return RunOnName(object, ifname, error, &Adapter::RemoveAdapter,
+                     "Failed to remove adapter(%s)");
 }
 
 gboolean wifi_refresh_adapter_list(GObject* object, GError** error) {
@@ -468,23 +480,11 @@ gboolean wifi_enable_wps_with_pin_code(GObject* object, const char* ifname, cons
 }
 
 gboolean wifi_switch_wifi_on_off(GObject* object, GError** error) {
-    if (object == nullptr) {
-        return BadParameter(error);
-    }
-    if (Adapter::SwitchOnOff() != 0) {
-        return WIFI_FAIL(error, "Failed to switch wifi on/off");
-    }
-    return TRUE;
+    return RunOnAll(object, error, &Adapter::SwitchOnOff, "Failed to switch wifi on/off");
 }
 
 gboolean wifi_reset_to_default(GObject* object, GError** error) {
-    if (object == nullptr) {
-        return BadParameter(error);
-    }
-    if (Adapter::ResetToDefault() != 0) {
-        return WIFI_FAIL(error, "Failed to reset to default");
-    }
-    return TRUE;
+    return RunOnAll(object, error, &Adapter::ResetToDefault, "Failed to reset to default");
 }
 
 namespace vornwireless {
