@@ -141,6 +141,19 @@ int GetConfig(const Json::Value& json, AdapterConfig& config) {
     return 0;
 }
 
+int ConnectionJsonToStationInfo(const Json::Value& json, AdapterConfig::StationInfo& station) {
+    AdapterConfig checked;
+    checked.name = "wlan0";  // the check wants an interface; only the station is looked at
+    Json::Value one(Json::arrayValue);
+    one.append(json);
+    if (!ArrayFromJson(one, checked.stations, kVisitStation) || CheckAdapterConfig(checked) != 0) {
+        VORN_LOG(LOG_ERR, "Bad station in connection");
+        return -1;
+    }
+    station = checked.stations.front();
+    return 0;
+}
+
 }  // namespace utils
 }  // namespace wifi
 }  // namespace vornwireless

@@ -18,6 +18,10 @@ Json::Value GetJsonValue(const AdapterConfig& config);
 // alone and returns -1.
 int GetConfig(const Json::Value& json, AdapterConfig& config);
 
+// One network in the JSON form of a configuration's "stations" entries, checked as GetConfig
+// checks it; -1 (logged, station left alone) otherwise.
+int ConnectionJsonToStationInfo(const Json::Value& json, AdapterConfig::StationInfo& station);
+
 }  // namespace utils
 }  // namespace wifi
 }  // namespace vornwireless

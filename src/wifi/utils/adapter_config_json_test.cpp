@@ -90,6 +90,15 @@ TEST_F(AdapterConfigJsonTest, RoundTripAndRefusals) {
         EXPECT_EQ(built, config_) << refusal.first;
     }
     EXPECT_EQ(GetConfig(Json::Value("text"), built), -1);
+
+    // One network alone, checked the same way.
+    AdapterConfig::StationInfo station;
+    ASSERT_EQ(ConnectionJsonToStationInfo(json["stations"][0], station), 0);
+    EXPECT_EQ(station, config_.stations[0]);
+    Json::Value hostile = json["stations"][0];
+    hostile["user"] = "u\n";
+    EXPECT_EQ(ConnectionJsonToStationInfo(hostile, station), -1);
+    EXPECT_EQ(station, config_.stations[0]);
 }
 
 }  // namespace
