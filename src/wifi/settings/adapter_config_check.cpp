@@ -63,7 +63,20 @@ class Checker {
     bool ok_ = true;
 };
 
+void CheckStation(Checker& check, const AdapterConfig::StationInfo& station) {
+    check.Ssid("stations.essid", station.essid);
+    check.Mac("stations.bssid", station.bssid);
+    check.Text("stations.user", station.user);
+    check.Passphrase("stations.password", station.password, IsPersonalWpa(station.security));
+}
+
 }  // namespace
+
+int CheckStationInfo(const AdapterConfig::StationInfo& station) {
+    Checker check;
+    CheckStation(check, station);
+    return check.Ok() ? 0 : -1;
+}
 
 int CheckAdapterConfig(const AdapterConfig& config) {
     Checker check;
@@ -84,12 +97,9 @@ int CheckAdapterConfig(const AdapterConfig& config) {
     }
     std::set<std::string> bssids;
     for (const auto& station : config.stations) {
-        check.Ssid("stations.essid", station.essid);
-        check.Mac("stations.bssid", station.bssid);
+        CheckStation(check, station);
         check.Require(bssids.insert(station.bssid.ToString()).second, "stations.bssid",
                       "is repeated");
-        check.Text("stations.user", station.user);
-        check.Passphrase("stations.password", station.password, IsPersonalWpa(station.security));
     }
     return check.Ok() ? 0 : -1;
 }

@@ -142,15 +142,14 @@ int GetConfig(const Json::Value& json, AdapterConfig& config) {
 }
 
 int ConnectionJsonToStationInfo(const Json::Value& json, AdapterConfig::StationInfo& station) {
-    AdapterConfig checked;
-    checked.name = "wlan0";  // the check wants an interface; only the station is looked at
+    std::vector<AdapterConfig::StationInfo> read;
     Json::Value one(Json::arrayValue);
     one.append(json);
-    if (!ArrayFromJson(one, checked.stations, kVisitStation) || CheckAdapterConfig(checked) != 0) {
+    if (!ArrayFromJson(one, read, kVisitStation) || CheckStationInfo(read.front()) != 0) {
         VORN_LOG(LOG_ERR, "Bad station in connection");
         return -1;
     }
-    station = checked.stations.front();
+    station = read.front();
     return 0;
 }
 
