@@ -192,7 +192,14 @@ TEST_F(VornwifidTest, ServesEveryMethodThroughTheBusAndTheClient) {
     EXPECT_EQ(Call("GetConnectedAPInfo", "wlan0").text,
               "Failed to load connected AP info for interface(wlan0)");
 
-    // The whole appliance's topology, with the hooks before and after.
+    // The whole appliance's topology, with the hooks before and after; a switch that fails
+    // half-way (lbr0's IPv6 cannot be turned off) still runs the after-stage.
+    const std::string lbr0Ipv6 = "/proc/sys/net/ipv6/conf/lbr0/disable_ipv6";
+    std::filesystem::remove_all(root_.Path("/proc/sys/net/ipv6/conf/lbr0"));
+    EXPECT_EQ(Call("SwitchTopology", "bridge").text, "Failed to switch topology(bridge)");
+    EXPECT_EQ(root_.ReadFile("/tmp/hooks"), "4 router bridge\n5 router bridge\n");
+    root_.WriteFile(lbr0Ipv6, "0\n");
+    std::filesystem::remove(root_.Path("/tmp/hooks"));
     EXPECT_EQ(client.SwitchTopology("bridge"), 0) << wifid_->Stderr();
     EXPECT_EQ(root_.ReadFile("/tmp/hooks"), "4 router bridge\n5 router bridge\n");
     ASSERT_EQ(client.GetBridgeList(value), 0);
