@@ -123,7 +123,7 @@ class VornwifidTest : public ::testing::Test {
         ASSERT_TRUE(wifid_->WaitForBusName(kService, kStartTimeout)) << wifid_->Stderr();
     }
     void ExpectServing() {
-        EXPECT_EQ(Call("GetAdapterList").text.find("wlan0") != std::string::npos, true);
+        EXPECT_THAT(Call("GetAdapterList").text, HasSubstr("wlan0"));
         EXPECT_TRUE(wifid_->Running()) << wifid_->Stderr();
     }
 
