@@ -4,14 +4,18 @@
 WORK=$(mktemp -d "${TMPDIR:-/tmp}/vorn-demo-XXXXXX")
 BUS_PID=
 DAEMON_PID=
+WIFID_PID=
 
 section() { printf '\n=== %s\n' "$*"; }
 
 cleanup() {
-    if [ -n "$DAEMON_PID" ] && kill -0 "$DAEMON_PID" 2>/dev/null; then
-        kill -TERM "$DAEMON_PID" 2>/dev/null || true
-        wait "$DAEMON_PID" 2>/dev/null || true
-    fi
+    local pid
+    for pid in "$WIFID_PID" "$DAEMON_PID"; do
+        if [ -n "$pid" ] && kill -0 "$pid" 2>/dev/null; then
+            kill -TERM "$pid" 2>/dev/null || true
+            wait "$pid" 2>/dev/null || true
+        fi
+    done
     if [ -n "$BUS_PID" ]; then
         kill -TERM "$BUS_PID" 2>/dev/null || true
         wait "$BUS_PID" 2>/dev/null || true
@@ -86,4 +90,22 @@ start_vornnetd() {
     "$PWD/$BUILD/daemons/vornnetd" --foreground 2>"$WORK/vornnetd.log" &
     DAEMON_PID=$!
     wait_until "$PWD/$BUILD/tools/vornnetdtool" --ready
+}
+
+# vornwifid of BUILD in the foreground on that bus (after vornnetd: its bridges announce their
+# gateway records there), its log in WORK/vornwifid.log; returns once it answers.
+start_vornwifid() {
+    section "vornwifid in the foreground (its log goes to $WORK/vornwifid.log)"
+    "$PWD/$BUILD/daemons/vornwifid" --foreground 2>"$WORK/vornwifid.log" &
+    WIFID_PID=$!
+    wait_until "$PWD/$BUILD/tools/vornwireless" --ready
+}
+
+# Stops a daemon with SIGTERM and shows its exit status.
+stop_daemon() {
+    local name=$1 pid=$2 status=0
+    kill -TERM "$pid"
+    wait_until gone "$pid" || kill -KILL "$pid"
+    wait "$pid" || status=$?
+    echo "$name exited with status $status"
 }
