@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "dbus/net_client.h"
+#include "support/gio_call.h"
 #include "support/log_capture.h"
 #include "support/private_bus.h"
 #include "support/sim_root.h"
@@ -70,44 +71,10 @@ const Method kMethods[] = {
     {"ResetIPv6Module", "info", "", false, "eth0", nullptr, nullptr},
 };
 
-// The outcome of one call: the reply's text, or the error reply's name and its own message.
-struct Answer {
-    bool ok = false;
-    std::string text;
-    std::string errorName;
-};
+using Answer = ServiceAnswer;
 
-// One call through GIO, parameters being a floating GVariant tuple.
 Answer CallService(const char* method, GVariant* parameters) {
-    Answer answer;
-    GError* error = nullptr;
-    GDBusConnection* bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, &error);
-    GVariant* reply = nullptr;
-    if (bus == nullptr) {
-        g_variant_unref(g_variant_ref_sink(parameters));
-    } else {
-        reply = g_dbus_connection_call_sync(
-            bus, kService, "/", kService, method, parameters, nullptr, G_DBUS_CALL_FLAGS_NONE,
-            static_cast<int>(kCallTimeout.count()), nullptr, &error);
-        g_object_unref(bus);
-    }
-    answer.ok = reply != nullptr;
-    if (reply != nullptr && g_variant_is_of_type(reply, G_VARIANT_TYPE("(s)"))) {
-        const char* text = nullptr;
-        g_variant_get(reply, "(&s)", &text);
-        answer.text = text;
-    }
-    if (reply != nullptr) {
-        g_variant_unref(reply);
-        return answer;
-    }
-    gchar* name = g_dbus_error_get_remote_error(error);
-    answer.errorName = name != nullptr ? name : "";
-    g_free(name);
-    g_dbus_error_strip_remote_error(error);
-    answer.text = error->message;
-    g_error_free(error);
-    return answer;
+    return vorn::test::CallService(kService, method, parameters, kCallTimeout);
 }
 
 Answer CallService(const char* method, const std::string& argument) {

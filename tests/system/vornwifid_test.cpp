@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "dbus/wifi_client.h"
+#include "support/gio_call.h"
 #include "support/log_capture.h"
 #include "support/private_bus.h"
 #include "support/sim_root.h"
@@ -33,41 +34,10 @@ constexpr Timeout kStartTimeout{60000};
 constexpr Timeout kCallTimeout{30000};
 constexpr Timeout kExitTimeout{20000};
 
-// The outcome of one call: the reply's text, or the error reply's own message.
-struct Answer {
-    bool ok = false;
-    std::string text;
-};
+using Answer = ServiceAnswer;
 
-// One call through GIO, parameters being a floating GVariant tuple of strings.
 Answer Call(const char* method, GVariant* parameters) {
-    Answer answer;
-    GError* error = nullptr;
-    GDBusConnection* bus = g_bus_get_sync(G_BUS_TYPE_SESSION, nullptr, &error);
-    if (bus == nullptr) {
-        g_variant_unref(g_variant_ref_sink(parameters));
-        answer.text = error->message;
-        g_error_free(error);
-        return answer;
-    }
-    GVariant* reply = g_dbus_connection_call_sync(
-        bus, kService, "/", kService, method, parameters, nullptr, G_DBUS_CALL_FLAGS_NONE,
-        static_cast<int>(kCallTimeout.count()), nullptr, &error);
-    g_object_unref(bus);
-    answer.ok = reply != nullptr;
-    if (reply == nullptr) {
-        g_dbus_error_strip_remote_error(error);
-        answer.text = error->message;
-        g_error_free(error);
-    } else {
-        if (g_variant_is_of_type(reply, G_VARIANT_TYPE("(s)"))) {
-            const char* text = nullptr;
-            g_variant_get(reply, "(&s)", &text);
-            answer.text = text;
-        }
-        g_variant_unref(reply);
-    }
-    return answer;
+    return CallService(kService, method, parameters, kCallTimeout);
 }
 
 Answer Call(const char* method) {
