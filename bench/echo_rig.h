@@ -1,7 +1,9 @@
 #ifndef VORN_BENCH_ECHO_RIG_H
 #define VORN_BENCH_ECHO_RIG_H
 
+#include <benchmark/benchmark.h>
 #include <gio/gio.h>
+#include <sys/types.h>
 
 #include <functional>
 #include <memory>
@@ -34,6 +36,21 @@ struct EchoRig {
 // at it, and stops it. The exit status of the benchmark program.
 int RunWithRig(int argc, char** argv, EchoRig*& rig,
                const std::function<void(EchoRig&)>& started = nullptr);
+
+// One blocking call with one text argument on the rig's connection: the reply's text, or the error
+// reply's own message.
+std::string CallText(EchoRig& rig, const char* service, const char* method,
+                     const std::string& argument);
+
+// Resident memory in kB from /proc/PID/smaps_rollup; -1 where unreadable.
+struct Memory {
+    long long rss = -1;
+    long long pss = -1;
+    long long privateKb = -1;  // Private_Clean + Private_Dirty
+};
+Memory ReadMemory(pid_t pid);
+// The counters PROCESS_Rss, _Pss and _Private, in bytes.
+void SetMemoryCounters(benchmark::State& state, const std::string& process, const Memory& memory);
 
 }  // namespace bench
 }  // namespace vorn

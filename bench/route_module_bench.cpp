@@ -14,7 +14,6 @@
 
 namespace {
 
-
 constexpr int kCallTimeoutMs = 10000;
 
 using vorn::bench::EchoRig;

@@ -5,61 +5,22 @@
 #include <gio/gio.h>
 
 #include <chrono>
-#include <cstdio>
-#include <fstream>
-#include <memory>
-#include <sstream>
 #include <string>
 
 #include "echo_rig.h"
 
 namespace {
 
-
 constexpr char kRequest[] = R"({"type":"GTYPE_V4"})";
 // What vornnetd's route module answers on a fresh root: an empty list.
 constexpr char kNetAnswer[] = "[]\n";
-constexpr int kCallTimeoutMs = 10000;
-
-// Resident memory in kB from /proc/PID/smaps_rollup; -1 where unreadable.
-struct Memory {
-    long long rss = -1;
-    long long pss = -1;
-    long long privateKb = -1;  // Private_Clean + Private_Dirty
-};
-
-Memory ReadMemory(pid_t pid) {
-    std::ifstream in("/proc/" + std::to_string(pid) + "/smaps_rollup");
-    Memory memory;
-    long long clean = -1;
-    long long dirty = -1;
-    // The first line names the range; then "Key:   value kB" lines.
-    for (std::string line; std::getline(in, line);) {
-        std::istringstream fields(line);
-        std::string key;
-        long long kb = 0;
-        if (!(fields >> key >> kb)) {
-            continue;
-        }
-        if (key == "Rss:") {
-            memory.rss = kb;
-        } else if (key == "Pss:") {
-            memory.pss = kb;
-        } else if (key == "Private_Clean:") {
-            clean = kb;
-        } else if (key == "Private_Dirty:") {
-            dirty = kb;
-        }
-    }
-    if (clean >= 0 && dirty >= 0) {
-        memory.privateKb = clean + dirty;
-    }
-    return memory;
-}
 
 using vorn::bench::EchoRig;
 using vorn::bench::kEchoService;
 using vorn::bench::kNetService;
+using vorn::bench::Memory;
+using vorn::bench::ReadMemory;
+using vorn::bench::SetMemoryCounters;
 
 EchoRig* rig = nullptr;
 // Each process's memory right after the rig started.
@@ -67,24 +28,8 @@ Memory busMemory;
 Memory vornnetdMemory;
 Memory echoMemory;
 
-// One blocking call with the request text; the reply's text or the error reply's own message.
 std::string Call(const char* service, const char* method) {
-    GError* error = nullptr;
-    GVariant* reply = g_dbus_connection_call_sync(
-        rig->connection.get(), service, "/", service, method, g_variant_new("(s)", kRequest),
-        nullptr, G_DBUS_CALL_FLAGS_NONE, kCallTimeoutMs, nullptr, &error);
-    std::string text;
-    if (reply != nullptr) {
-        const char* answer = nullptr;
-        g_variant_get(reply, "(&s)", &answer);
-        text = answer;
-        g_variant_unref(reply);
-    } else {
-        g_dbus_error_strip_remote_error(error);
-        text = error->message;
-        g_error_free(error);
-    }
-    return text;
+    return vorn::bench::CallText(*rig, service, method, kRequest);
 }
 
 void BM_SequentialRoundTrips(benchmark::State& state) {
@@ -111,18 +56,6 @@ void BM_SequentialRoundTrips(benchmark::State& state) {
     state.counters["vornnetd_vs_echo"] = netRate / echoRate;
 }
 BENCHMARK(BM_SequentialRoundTrips)->Unit(benchmark::kMicrosecond);
-
-// In bytes, shown with 1024-based prefixes.
-benchmark::Counter Bytes(long long kb) {
-    return benchmark::Counter(static_cast<double>(kb) * 1024, benchmark::Counter::kDefaults,
-                              benchmark::Counter::kIs1024);
-}
-
-void SetMemoryCounters(benchmark::State& state, const std::string& process, const Memory& memory) {
-    state.counters[process + "_Rss"] = Bytes(memory.rss);
-    state.counters[process + "_Pss"] = Bytes(memory.pss);
-    state.counters[process + "_Private"] = Bytes(memory.privateKb);
-}
 
 // Reads nothing itself: reports what each process used right after start.
 void BM_MemoryAfterStart(benchmark::State& state) {
