@@ -2,6 +2,7 @@
 
 #include <syslog.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <memory>
 
@@ -60,6 +61,33 @@ int ExitStatus(int result) {
         return 0;
     }
     return result < -125 ? 125 : -result;
+}
+
+bool OneCommandGiven(const char* name, const std::vector<const CLI::Option*>& commands) {
+    const auto given = std::count_if(commands.begin(), commands.end(),
+                                     [](const CLI::Option* option) { return option->count() > 0; });
+    if (given != 1) {
+        std::fprintf(stderr, "%s: give exactly one command (--help lists them)\n", name);
+        return false;
+    }
+    return true;
+}
+
+int ReportReady(bool up) {
+    std::printf("%s\n", up ? "ready" : "not ready");
+    return up ? 0 : 1;
+}
+
+int FinishCall(const char* name, const char* option, int result, const Json::Value* answer,
+               bool compact) {
+    if (result < 0) {
+        std::fprintf(stderr, "%s: %s failed (%d)\n", name, option, result);
+        return ExitStatus(result);
+    }
+    if (answer != nullptr) {
+        PrintJson(*answer, compact);
+    }
+    return 0;
 }
 
 }  // namespace tools

@@ -5,6 +5,7 @@
 
 #include <CLI/CLI.hpp>
 #include <string>
+#include <vector>
 
 // What the command-line tools share: their help layout, output and exit status.
 namespace vorn {
@@ -28,6 +29,14 @@ void SendLogToStderr(const char* name);
 void PrintJson(const Json::Value& data, bool compact);
 // A method's result as an exit status: 0, or its error number (at most 125).
 int ExitStatus(int result);
+// Exactly one of the commands' options was given; otherwise says so on standard error.
+bool OneCommandGiven(const char* name, const std::vector<const CLI::Option*>& commands);
+// --ready's answer, "ready" or "not ready"; the exit status.
+int ReportReady(bool up);
+// The end of a call: "NAME: OPTION failed (N)" and the error's exit status, or 0 after printing
+// the answer when the method has one.
+int FinishCall(const char* name, const char* option, int result, const Json::Value* answer,
+               bool compact);
 
 }  // namespace tools
 }  // namespace vorn

@@ -465,14 +465,8 @@ int RunServiceCommand(const Command& command, const std::string& text, bool comp
     NetClient client;
     Json::Value data;
     const int result = command.call(client, text, request, data);
-    if (result < 0) {
-        std::fprintf(stderr, "vornnetdtool: %s failed (%d)\n", command.option, result);
-        return vorn::tools::ExitStatus(result);
-    }
-    if (command.hasAnswer) {
-        vorn::tools::PrintJson(data, compact);
-    }
-    return 0;
+    return vorn::tools::FinishCall("vornnetdtool", command.option, result,
+                                   command.hasAnswer ? &data : nullptr, compact);
 }
 
 }  // namespace
@@ -485,8 +479,9 @@ int main(int argc, char** argv) {
     bool ready = false;
     app.add_flag("--compact", compact, "print the answer on one line");
     const char* serviceGroup = "Service commands";
-    app.add_flag("--ready", ready, "exit 0 when vornnetd runs and owns its name")
-        ->group(serviceGroup);
+    const CLI::Option* readyOption =
+        app.add_flag("--ready", ready, "exit 0 when vornnetd runs and owns its name")
+            ->group(serviceGroup);
     std::vector<std::string> serviceText(Commands().size());
     std::vector<const CLI::Option*> serviceOptions;
     for (std::size_t i = 0; i < Commands().size(); ++i) {
@@ -511,19 +506,15 @@ int main(int argc, char** argv) {
     if (!vorn::tools::ParseCommandLine(app, argc, argv, "vornnetdtool", status)) {
         return status;
     }
-    const auto given = [](const std::vector<const CLI::Option*>& options) {
-        return std::count_if(options.begin(), options.end(),
-                             [](const CLI::Option* option) { return option->count() > 0; });
-    };
-    if ((ready ? 1 : 0) + given(serviceOptions) + given(routeOptions) != 1) {
-        std::fprintf(stderr, "vornnetdtool: give exactly one command (--help lists them)\n");
+    std::vector<const CLI::Option*> commands = serviceOptions;
+    commands.insert(commands.end(), routeOptions.begin(), routeOptions.end());
+    commands.push_back(readyOption);
+    if (!vorn::tools::OneCommandGiven("vornnetdtool", commands)) {
         return 2;
     }
     vorn::tools::SendLogToStderr("vornnetdtool");
     if (ready) {
-        const bool up = NetClient().IsServerReady();
-        std::printf("%s\n", up ? "ready" : "not ready");
-        return up ? 0 : 1;
+        return vorn::tools::ReportReady(NetClient().IsServerReady());
     }
     for (std::size_t i = 0; i < routeOptions.size(); ++i) {
         if (routeOptions[i]->count() > 0) {

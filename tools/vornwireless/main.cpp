@@ -1,6 +1,5 @@
 // vornwireless: calls the methods of the wifi daemon's service from the command line. The hourly
 // crontab entry of a radio's schedule runs a copy of it with --exec-schedule.
-#include <algorithm>
 #include <cstdio>
 #include <functional>
 #include <string>
@@ -151,14 +150,8 @@ int Run(const Command& command, Words words, bool compact) {
         return 1;
     }
     const int result = command.call(client, words, data);
-    if (result < 0) {
-        std::fprintf(stderr, "vornwireless: %s failed (%d)\n", command.option, result);
-        return vorn::tools::ExitStatus(result);
-    }
-    if (command.hasAnswer) {
-        vorn::tools::PrintJson(data, compact);
-    }
-    return 0;
+    return vorn::tools::FinishCall("vornwireless", command.option, result,
+                                   command.hasAnswer ? &data : nullptr, compact);
 }
 
 }  // namespace
@@ -170,7 +163,9 @@ int main(int argc, char** argv) {
     bool ready = false;
     app.add_flag("--compact", compact, "print the answer on one line");
     const char* group = "Commands";
-    app.add_flag("--ready", ready, "exit 0 when vornwifid runs and owns its name")->group(group);
+    const CLI::Option* readyOption =
+        app.add_flag("--ready", ready, "exit 0 when vornwifid runs and owns its name")
+            ->group(group);
     std::vector<Words> words(Commands().size());
     std::vector<const CLI::Option*> options;
     for (std::size_t i = 0; i < Commands().size(); ++i) {
@@ -186,17 +181,14 @@ int main(int argc, char** argv) {
     if (!vorn::tools::ParseCommandLine(app, argc, argv, "vornwireless", status)) {
         return status;
     }
-    const auto given = std::count_if(options.begin(), options.end(),
-                                     [](const CLI::Option* option) { return option->count() > 0; });
-    if ((ready ? 1 : 0) + given != 1) {
-        std::fprintf(stderr, "vornwireless: give exactly one command (--help lists them)\n");
+    std::vector<const CLI::Option*> commands = options;
+    commands.push_back(readyOption);
+    if (!vorn::tools::OneCommandGiven("vornwireless", commands)) {
         return 2;
     }
     vorn::tools::SendLogToStderr("vornwireless");
     if (ready) {
-        const bool up = WifiClient().IsServerReady();
-        std::printf("%s\n", up ? "ready" : "not ready");
-        return up ? 0 : 1;
+        return vorn::tools::ReportReady(WifiClient().IsServerReady());
     }
     for (std::size_t i = 0; i < options.size(); ++i) {
         if (options[i]->count() > 0) {
