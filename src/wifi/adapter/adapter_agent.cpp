@@ -1,5 +1,7 @@
 #include "wifi/adapter/adapter_agent.h"
 
+#include "platform/qlibc_file.h"
+#include "platform/qlibc_proc.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
 #include "wifi/adapter/adapter_agent_client.h"
@@ -10,6 +12,8 @@
 namespace vornwireless {
 namespace wifi {
 namespace {
+
+constexpr const char* kRfkill = "/usr/vorn/sbin/rfkill";
 
 const char* KindName(AdapterAgent::Kind kind) {
     switch (kind) {
@@ -70,6 +74,26 @@ AdapterAgent* AdapterAgent::Create(const AdapterConfig& config) {
     // The RLT agents are not part of this build yet.
     VORN_LOG(LOG_ERR, "No %s agent for [%s] in this build", KindName(kind), config.name.c_str());
     return nullptr;
+}
+
+bool AdapterAgent::HasRadioSwitch() {
+    return utils::IsKiteAModel() && QLIBCFileExist(kRfkill) == 1;
+}
+
+int AdapterAgent::SwitchRadio(const char* action) {
+    return QLIBCExecl(kRfkill, QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT, action,
+                      "wifi", nullptr);
+}
+
+int AdapterAgent::BlockRadioWhenUnused() const {
+    if (Adapter::GetEnabledAdapterCount() != 0 || !HasRadioSwitch()) {
+        return 0;
+    }
+    if (SwitchRadio("block") != 0) {
+        VORN_LOG(LOG_ERR, "Failed to execute rfkill block");
+        return -1;
+    }
+    return 0;
 }
 
 int AdapterAgent::Delete(const AdapterAgent* agent) {

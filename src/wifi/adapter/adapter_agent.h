@@ -53,6 +53,13 @@ class AdapterAgent {
   protected:
     explicit AdapterAgent(const std::string& name) : name_(name) {}
 
+    // The Kite A's radio switch (rfkill): whether the model has one, and turning it on or off
+    // ("unblock", "block").
+    static bool HasRadioSwitch();
+    static int SwitchRadio(const char* action);
+    // Turns the radio switch off once no adapter is enabled any more.
+    int BlockRadioWhenUnused() const;
+
   private:
     std::string name_;
 };

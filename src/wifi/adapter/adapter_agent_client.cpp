@@ -35,7 +35,6 @@ constexpr const char* kSupplicantName = "wpa_supplicant";
 constexpr const char* kReconnectScript = "/usr/vorn/etc/wifi/wpa_post_reconnect.sh";
 constexpr const char* kIwconfig = "/sbin/iwconfig";
 constexpr const char* kIfconfig = "/sbin/ifconfig";
-constexpr const char* kRfkill = "/usr/vorn/sbin/rfkill";
 constexpr const char* kZeroBssid = "00:00:00:00:00:00";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
 constexpr int kQuietFlags = kExecFlags | QLIBC_EXEC_NO_STDERR;
@@ -396,18 +395,6 @@ int AdapterAgentClient::DoConnecting() {
     }
     if (SetupAddress() != 0) {
         VORN_LOG(LOG_ERR, "Failed on post processing");
-        return -1;
-    }
-    return 0;
-}
-
-int AdapterAgentClient::BlockRadioWhenUnused() const {
-    if (Adapter::GetEnabledAdapterCount() != 0 || !utils::IsKiteAModel() ||
-        QLIBCFileExist(kRfkill) != 1) {
-        return 0;
-    }
-    if (QLIBCExecl(kRfkill, kExecFlags, "block", "wifi", nullptr) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to execute rfkill block");
         return -1;
     }
     return 0;

@@ -57,7 +57,6 @@ class AdapterAgentClient : public AdapterAgentClientBase {
     int TerminateWpa() const;
     int DisconnectKillWpa() const;
     int TakeInterfaceDown() const;
-    int BlockRadioWhenUnused() const;
 };
 
 }  // namespace wifi

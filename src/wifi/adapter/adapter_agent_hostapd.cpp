@@ -29,7 +29,6 @@ constexpr const char* kHostapdDir = "/etc/hostapd";
 constexpr const char* kMacList = "/etc/hostapd/hostapd-mac.list";
 constexpr const char* kControlDir = "/var/run/hostapd";
 constexpr const char* kNetworkScript = "/etc/rc.network";
-constexpr const char* kRfkill = "/usr/vorn/sbin/rfkill";
 constexpr const char* kHostapdCli = "/usr/bin/hostapd_cli";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
 constexpr int kQuietFlags = kExecFlags | QLIBC_EXEC_NO_STDERR;
@@ -291,14 +290,6 @@ bool WriteFile(const std::string& logical, const std::string& content) {
     return vorn::platform::WriteFileAtomically(vorn::platform::RootPath(logical), content);
 }
 
-bool HasRfkill() {
-    return access(vorn::platform::RootPath(kRfkill).c_str(), F_OK) == 0;
-}
-
-int RunRfkill(const char* action) {
-    return QLIBCExecl(kRfkill, kExecFlags, action, "wifi", nullptr);
-}
-
 // The radio's maximum power in dBm on the channel (the first listed for the automatic channel),
 // or 0 when iw lists none.
 double ReadMaxPower(int channel) {
@@ -393,22 +384,10 @@ int AdapterAgentHostapd::GenerateHostapdConfig(const AdapterConfig& config) {
     return 0;
 }
 
-int AdapterAgentHostapd::BlockRadioWhenUnused() const {
-    if (Adapter::GetEnabledAdapterCount() != 0 || !utils::IsKiteAModel() || !HasRfkill()) {
-        return 0;
-    }
-    if (RunRfkill("block") != 0) {
-        VORN_LOG(LOG_ERR, "Failed to execute rfkill block");
-        return -1;
-    }
-    return 0;
-}
-
 int AdapterAgentHostapd::EnableAP(const AdapterConfig& config) {
     if (GenerateHostapdConfig(config) != 0) {
         VORN_LOG(LOG_ERR, "Faild to generate hostapd conf");
-    } else if (config.enabled && utils::IsKiteAModel() && HasRfkill() &&
-               RunRfkill("unblock") != 0) {
+    } else if (config.enabled && HasRadioSwitch() && SwitchRadio("unblock") != 0) {
         VORN_LOG(LOG_ERR, "Failed to execute rfkill unblock");
     } else if (QLIBCExecl(kNetworkScript, kExecFlags, "start-ap", GetName().c_str(), nullptr) !=
                0) {

@@ -46,8 +46,6 @@ class AdapterAgentHostapd : public AdapterAgentAP {
     explicit AdapterAgentHostapd(const std::string& name) : AdapterAgentAP(name) {}
 
   private:
-    // Blocks the radios through rfkill on the kite-a model once no adapter is enabled. 0 or -1.
-    int BlockRadioWhenUnused() const;
     bool IsNameValid() const;
 };
 
