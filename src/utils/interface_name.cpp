@@ -1,5 +1,7 @@
 #include "utils/interface_name.h"
 
+#include "utils/log.h"
+
 namespace vornwireless {
 namespace utils {
 
@@ -13,6 +15,14 @@ bool IsValidInterfaceName(const std::string& name) {
         if (!alnum && std::string("-_.:@+").find(c) == std::string::npos) {
             return false;
         }
+    }
+    return true;
+}
+
+bool CheckInterfaceName(const std::string& name) {
+    if (!IsValidInterfaceName(name)) {
+        VORN_LOG(LOG_ERR, "Refused interface name [%s]", name.c_str());
+        return false;
     }
     return true;
 }

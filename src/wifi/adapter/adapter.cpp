@@ -11,6 +11,7 @@
 #include "platform/vorn_bridge.h"
 #include "platform/vorn_net.h"
 #include "platform/vorn_schedule.h"
+#include "utils/interface_name.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter_agent_ap.h"
 #include "wifi/bridge/bridge_base.h"
@@ -126,6 +127,10 @@ Adapter::List& Adapter::GetList() {
 }
 
 std::unique_ptr<Adapter> Adapter::Create(const std::string& name) {
+    // The name builds the settings' paths and reaches the agents' command lines.
+    if (!vornwireless::utils::CheckInterfaceName(name)) {
+        return nullptr;
+    }
     if (GetTopology() == WIFI_TOPOLOGY_ERROR) {
         VORN_LOG(LOG_ERR, "Failed to read topology from vorninfo.conf");
         return nullptr;

@@ -2,6 +2,7 @@
 
 #include "platform/qlibc_file.h"
 #include "platform/qlibc_proc.h"
+#include "utils/interface_name.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
 #include "wifi/adapter/adapter_agent_client.h"
@@ -94,6 +95,10 @@ int AdapterAgent::BlockRadioWhenUnused() const {
         return -1;
     }
     return 0;
+}
+
+bool AdapterAgent::IsNameValid() const {
+    return vornwireless::utils::CheckInterfaceName(name_);
 }
 
 int AdapterAgent::Delete(const AdapterAgent* agent) {

@@ -59,6 +59,8 @@ class AdapterAgent {
     static int SwitchRadio(const char* action);
     // Turns the radio switch off once no adapter is enabled any more.
     int BlockRadioWhenUnused() const;
+    // The name is one that may reach a command line (logged when not).
+    bool IsNameValid() const;
 
   private:
     std::string name_;

@@ -20,16 +20,6 @@ constexpr const char* kGuestScript = "/usr/vorn/etc/iptables_guest_net.sh";
 constexpr const char* kTool = "/usr/vorn/bin/vornwireless";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
 
-// The interface name reaches command lines and the crontab line: the kernel allows "$", "`",
-// ";" and "%" in names.
-bool CheckName(const std::string& ifname) {
-    if (!vornwireless::utils::IsValidInterfaceName(ifname)) {
-        VORN_LOG(LOG_ERR, "Refused interface name [%s]", ifname.c_str());
-        return false;
-    }
-    return true;
-}
-
 int RunGuestScript(const char* action, const char* what, const std::string& ifname) {
     return QLIBCExecl(kGuestScript, kExecFlags, action, what,
                       ifname.empty() ? nullptr : ifname.c_str(), nullptr);
@@ -71,7 +61,7 @@ int AdapterAgentAP::EnableRuleGuest(const AdapterConfig& config) {
     if (!config.guest_support || !config.enabled || !config.guest_enabled) {
         return 0;
     }
-    if (!CheckName(config.name)) {
+    if (!vornwireless::utils::CheckInterfaceName(config.name)) {
         return -1;
     }
     if (RunGuestScript("ins", "mod", "") != 0) {
@@ -89,7 +79,7 @@ int AdapterAgentAP::DisableRuleGuest(const AdapterConfig& config) {
     if (!config.guest_support) {
         return 0;
     }
-    if (!CheckName(config.name)) {
+    if (!vornwireless::utils::CheckInterfaceName(config.name)) {
         return -1;
     }
     if (RunGuestScript("del", "all", config.name) != 0) {
@@ -115,7 +105,7 @@ int AdapterAgentAP::SetSchedule(const AdapterConfig& config) {
     if (!config.schedule_enabled && !(config.guest_support && config.guest_schedule_enabled)) {
         return RemoveSchedule(config);
     }
-    if (!CheckName(config.name)) {
+    if (!vornwireless::utils::CheckInterfaceName(config.name)) {
         return -1;
     }
     if (VORNScheduleSet(ScheduleCommand(config.name).c_str(), 127, 0, 23, 0) != 0) {
@@ -130,7 +120,7 @@ int AdapterAgentAP::SetSchedule(const AdapterConfig& config) {
 }
 
 int AdapterAgentAP::RemoveSchedule(const AdapterConfig& config) {
-    if (!CheckName(config.name)) {
+    if (!vornwireless::utils::CheckInterfaceName(config.name)) {
         return -1;
     }
     if (VORNScheduleRemove(ScheduleCommand(config.name).c_str()) != 0) {

@@ -125,14 +125,6 @@ void AdapterAgentClientBase::Pause() {
     std::this_thread::sleep_for(pollInterval);
 }
 
-bool AdapterAgentClientBase::IsNameValid() const {
-    if (!vornwireless::utils::IsValidInterfaceName(GetName())) {
-        VORN_LOG(LOG_ERR, "Refused interface name [%s]", GetName().c_str());
-        return false;
-    }
-    return true;
-}
-
 void AdapterAgentClientBase::SetStation(const AdapterConfig::StationInfo& station) {
     station_ = station;
     adhoc_ = station.opmode == WIFI_OPMODE_AD_HOC;

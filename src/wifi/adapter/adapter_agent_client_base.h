@@ -56,7 +56,6 @@ class AdapterAgentClientBase : public AdapterAgent {
     using AdapterAgent::AdapterAgent;
 
     static void Pause();
-    bool IsNameValid() const;
     const AdapterConfig::StationInfo& Station() const { return station_; }
     bool IsAdHoc() const { return adhoc_; }
     void SetStation(const AdapterConfig::StationInfo& station);

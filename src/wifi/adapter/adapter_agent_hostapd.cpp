@@ -333,14 +333,6 @@ bool IsWpsPin(const std::string& pin) {
 
 }  // namespace
 
-bool AdapterAgentHostapd::IsNameValid() const {
-    if (!vornwireless::utils::IsValidInterfaceName(GetName())) {
-        VORN_LOG(LOG_ERR, "Refused interface name [%s]", GetName().c_str());
-        return false;
-    }
-    return true;
-}
-
 int AdapterAgentHostapd::GenerateMacFilterConfig(const AdapterConfig& config) {
     std::string list;
     int count = 0;

@@ -46,7 +46,6 @@ class AdapterAgentHostapd : public AdapterAgentAP {
     explicit AdapterAgentHostapd(const std::string& name) : AdapterAgentAP(name) {}
 
   private:
-    bool IsNameValid() const;
 };
 
 }  // namespace wifi

@@ -50,8 +50,7 @@ bool IsInterfaceUp(const std::string& name) {
 
 AdapterCapability* AdapterCapability::Create(const std::string& name) {
     // The name reaches the probes' command lines.
-    if (!vornwireless::utils::IsValidInterfaceName(name)) {
-        VORN_LOG(LOG_ERR, "Refused interface name [%s]", name.c_str());
+    if (!vornwireless::utils::CheckInterfaceName(name)) {
         return nullptr;
     }
     if (utils::IsKiteBBuiltInWlan(name)) {

@@ -25,8 +25,7 @@ constexpr std::size_t kStatusLineBytes = 512;
 
 // "key=value" lines of "wpa_cli -i IF status".
 bool ReadSupplicantStatus(const std::string& ifname, std::map<std::string, std::string>& status) {
-    if (!vornwireless::utils::IsValidInterfaceName(ifname)) {
-        VORN_LOG(LOG_ERR, "Refused interface name [%s]", ifname.c_str());
+    if (!vornwireless::utils::CheckInterfaceName(ifname)) {
         return false;
     }
     const std::string command = "/usr/sbin/wpa_cli -i " + ifname + " status";
