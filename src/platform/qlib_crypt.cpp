@@ -1,15 +1,14 @@
 #include "platform/qlib_crypt.h"
 
 #include <fcntl.h>
-#include <openssl/crypto.h>
-#include <openssl/evp.h>
-#include <openssl/rand.h>
+#include <nettle/gcm.h>
+#include <nettle/memops.h>
+#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
-#include <memory>
 #include <string>
 #include <vector>
 
@@ -36,8 +35,12 @@ int Fail(int code) {
 // Wipes the key when it goes out of scope.
 struct Key {
     unsigned char bytes[kKeyLength] = {};
-    ~Key() { OPENSSL_cleanse(bytes, sizeof(bytes)); }
+    ~Key() { explicit_bzero(bytes, sizeof(bytes)); }
 };
+
+bool RandomBytes(unsigned char* bytes, std::size_t length) {
+    return getrandom(bytes, length, 0) == static_cast<ssize_t>(length);
+}
 
 // Exactly kKeyLength bytes, or the file is not a key.
 bool ReadKey(const std::string& real, Key& key) {
@@ -61,7 +64,7 @@ bool CreateKey(const std::string& real) {
         return false;
     }
     Key key;
-    bool ok = fchmod(fd, 0600) == 0 && RAND_bytes(key.bytes, kKeyLength) == 1 &&
+    bool ok = fchmod(fd, 0600) == 0 && RandomBytes(key.bytes, kKeyLength) &&
               write(fd, key.bytes, kKeyLength) == static_cast<ssize_t>(kKeyLength) &&
               fsync(fd) == 0;
     ok = close(fd) == 0 && ok;
@@ -84,54 +87,51 @@ bool LoadKey(Key& key) {
     return CreateKey(real) && ReadKey(real, key);
 }
 
-struct ContextDeleter {
-    void operator()(EVP_CIPHER_CTX* context) const { EVP_CIPHER_CTX_free(context); }
-};
-using Context = std::unique_ptr<EVP_CIPHER_CTX, ContextDeleter>;
+// The expanded key is wiped with the context; the version prefix is authenticated with the text,
+// so it cannot be swapped.
+class Gcm {
+  public:
+    Gcm(const Key& key, const Bytes& nonce) {
+        gcm_aes256_set_key(&context_, key.bytes);
+        gcm_aes256_set_iv(&context_, nonce.size(), nonce.data());
+        gcm_aes256_update(&context_, kPrefixLength, reinterpret_cast<const uint8_t*>(kPrefix));
+    }
+    ~Gcm() { explicit_bzero(&context_, sizeof(context_)); }
+    Gcm(const Gcm&) = delete;
+    Gcm& operator=(const Gcm&) = delete;
 
-// The version prefix is authenticated with the text, so it cannot be swapped.
-bool Seal(const Key& key, const Bytes& nonce, const std::string& plain, Bytes& sealed) {
-    Context context(EVP_CIPHER_CTX_new());
+    void Encrypt(std::size_t length, uint8_t* out, const uint8_t* in) {
+        gcm_aes256_encrypt(&context_, length, out, in);
+    }
+    void Decrypt(std::size_t length, uint8_t* out, const uint8_t* in) {
+        gcm_aes256_decrypt(&context_, length, out, in);
+    }
+    void Tag(uint8_t* tag) { gcm_aes256_digest(&context_, kTagLength, tag); }
+
+  private:
+    gcm_aes256_ctx context_{};
+};
+
+void Seal(const Key& key, const Bytes& nonce, const std::string& plain, Bytes& sealed) {
+    Gcm gcm(key, nonce);
     sealed.assign(plain.size() + kTagLength, 0);
-    int length = 0;
-    int tail = 0;
-    const bool ok =
-        context &&
-        EVP_EncryptInit_ex(context.get(), EVP_aes_256_gcm(), nullptr, key.bytes, nonce.data()) ==
-            1 &&
-        EVP_EncryptUpdate(context.get(), nullptr, &length,
-                          reinterpret_cast<const unsigned char*>(kPrefix), kPrefixLength) == 1 &&
-        EVP_EncryptUpdate(context.get(), sealed.data(), &length,
-                          reinterpret_cast<const unsigned char*>(plain.data()),
-                          static_cast<int>(plain.size())) == 1 &&
-        EVP_EncryptFinal_ex(context.get(), sealed.data() + length, &tail) == 1 &&
-        EVP_CIPHER_CTX_ctrl(context.get(), EVP_CTRL_GCM_GET_TAG, kTagLength,
-                            sealed.data() + plain.size()) == 1;
-    return ok;
+    gcm.Encrypt(plain.size(), sealed.data(), reinterpret_cast<const uint8_t*>(plain.data()));
+    gcm.Tag(sealed.data() + plain.size());
 }
 
-bool Open(const Key& key, const Bytes& nonce, Bytes& sealed, std::string& plain) {
-    Context context(EVP_CIPHER_CTX_new());
+bool Open(const Key& key, const Bytes& nonce, const Bytes& sealed, std::string& plain) {
+    Gcm gcm(key, nonce);
     const std::size_t textLength = sealed.size() - kTagLength;
-    Bytes out(textLength + 1, 0);
-    int length = 0;
-    int tail = 0;
-    const bool ok =
-        context &&
-        EVP_DecryptInit_ex(context.get(), EVP_aes_256_gcm(), nullptr, key.bytes, nonce.data()) ==
-            1 &&
-        EVP_DecryptUpdate(context.get(), nullptr, &length,
-                          reinterpret_cast<const unsigned char*>(kPrefix), kPrefixLength) == 1 &&
-        EVP_DecryptUpdate(context.get(), out.data(), &length, sealed.data(),
-                          static_cast<int>(textLength)) == 1 &&
-        EVP_CIPHER_CTX_ctrl(context.get(), EVP_CTRL_GCM_SET_TAG, kTagLength,
-                            sealed.data() + textLength) == 1 &&
-        EVP_DecryptFinal_ex(context.get(), out.data() + length, &tail) == 1;
-    if (ok) {
-        plain.assign(reinterpret_cast<const char*>(out.data()), textLength);
+    plain.assign(textLength, '\0');
+    gcm.Decrypt(textLength, reinterpret_cast<uint8_t*>(&plain[0]), sealed.data());
+    uint8_t tag[kTagLength];
+    gcm.Tag(tag);
+    if (memeql_sec(tag, sealed.data() + textLength, kTagLength) == 0) {
+        explicit_bzero(&plain[0], plain.size());
+        plain.clear();
+        return false;
     }
-    OPENSSL_cleanse(out.data(), out.size());
-    return ok;
+    return true;
 }
 
 std::string ToHex(const Bytes& bytes) {
@@ -185,9 +185,10 @@ int QLIBCryptSzEncrypt(const char* plain, char* cipher, int size) {
     }
     Bytes nonce(kNonceLength, 0);
     Bytes sealed;
-    if (RAND_bytes(nonce.data(), kNonceLength) != 1 || !Seal(key, nonce, plain, sealed)) {
+    if (!RandomBytes(nonce.data(), kNonceLength)) {
         return Fail(QLIBC_ERR_NO_MEMORY);
     }
+    Seal(key, nonce, plain, sealed);
     const std::string text = kPrefix + ToHex(nonce) + ToHex(sealed);
     std::memcpy(cipher, text.c_str(), text.size() + 1);
     return 0;
@@ -217,11 +218,11 @@ int QLIBCryptSzDecrypt(const char* cipher, char* plain, int size) {
         return Fail(QLIBC_ERR_FORMAT);
     }
     if (text.size() >= static_cast<std::size_t>(size) || text.find('\0') != std::string::npos) {
-        OPENSSL_cleanse(&text[0], text.size());
+        explicit_bzero(&text[0], text.size());
         return Fail(QLIBC_ERR_INVALID_ARG);
     }
     std::memcpy(plain, text.c_str(), text.size() + 1);
-    OPENSSL_cleanse(&text[0], text.size());
+    explicit_bzero(&text[0], text.size());
     return 0;
 }
 

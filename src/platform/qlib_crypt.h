@@ -7,7 +7,7 @@ extern "C" {
 
 /* The device's string cipher, which keeps passwords in setting files.
  *
- * AES-256-GCM under a device key: 32 random bytes in "/etc/vorn/wifi_cipher.key" (under the root
+ * AES-256-GCM (nettle) under a device key: 32 random bytes in "/etc/vorn/wifi_cipher.key" (under the root
  * prefix), created with mode 0600 on first use. A cipher text is printable and one line:
  * "vc1:" followed by lower-case hex of a random 12-byte nonce, the enciphered bytes and the
  * 16-byte tag. It is QLIB_CRYPT_CIPHER_SIZE(strlen(plain)) bytes long with its NUL. */

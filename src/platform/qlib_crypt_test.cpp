@@ -59,6 +59,12 @@ TEST_F(QlibCryptTest, RoundTripTamperAndForeignKey) {
     EXPECT_EQ(Decrypt(cipher), "FAILED");
     EXPECT_EQ(Decrypt(Encrypt(secret)), secret);
 
+    // Settings files written before keep deciphering: a text made under a known key.
+    root_.WriteFile("/etc/vorn/wifi_cipher.key", "0123456789abcdef0123456789abcdef");
+    EXPECT_EQ(
+        Decrypt("vc1:c52f818d3e691f99593968107dcf948fc43105efc8d2151bc8fcd1ada3f839621d10be3e68"),
+        "pass;word");
+
     char small[8];
     EXPECT_EQ(QLIBCryptSzEncrypt(secret.c_str(), small, sizeof(small)), -1);
     EXPECT_EQ(QLIBCErrGet(), QLIBC_ERR_INVALID_ARG);
