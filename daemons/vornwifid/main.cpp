@@ -1,6 +1,7 @@
 // vornwifid: the wifi daemon. Brings up the bridges and adapters of the stored topology and serves
 // "com.tessarin.wifi".
 #include <glib-unix.h>
+#include <malloc.h>
 #include <signal.h>
 #include <sys/timerfd.h>
 #include <unistd.h>
@@ -108,6 +109,8 @@ void StartWifi() {
         VORN_LOG(LOG_ERR, "Failed to refresh adapter list");
     }
     ExecSchedules();
+    // Start-up reads and writes every settings file; what it freed goes back to the system.
+    malloc_trim(0);
 }
 
 }  // namespace

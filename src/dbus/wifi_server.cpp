@@ -3,6 +3,8 @@
 #include <json/json.h>
 
 #include <chrono>
+#include <cstdint>
+#include <map>
 #include <string>
 #include <thread>
 #include <vector>
@@ -196,13 +198,35 @@ gboolean wifi_get_adapter_list(GObject* object, char** list, GError** error) {
     return Reply(names, list);
 }
 
+// The styled text of each adapter's configuration, built again only when its revision changed:
+// building it costs more than all the rest of a "GetAdapterConfig" call. Handlers run on the
+// service thread only.
+const std::string& ConfigText(const Adapter& adapter) {
+    struct Entry {
+        std::uint64_t revision = 0;
+        std::string text;
+    };
+    static std::map<std::string, Entry> cache;
+    Entry& entry = cache[adapter.GetName()];
+    const std::uint64_t revision = adapter.GetConfigRevision();
+    if (entry.text.empty() || entry.revision != revision) {
+        entry.text = vornwireless::utils::StyledJson(wifiutils::GetJsonValue(adapter.GetConfig()));
+        entry.revision = revision;
+    }
+    return entry.text;
+}
+
 gboolean wifi_get_adapter_config(GObject* object, const char* ifname, char** config,
                                  GError** error) {
     if (object == nullptr || ifname == nullptr || config == nullptr) {
         return BadParameter(error);
     }
     const Adapter* adapter = FindAdapter(ifname, error);
-    return adapter != nullptr && Reply(wifiutils::GetJsonValue(adapter->GetConfig()), config);
+    if (adapter == nullptr) {
+        return FALSE;
+    }
+    *config = g_strdup(ConfigText(*adapter).c_str());
+    return TRUE;
 }
 
 gboolean wifi_get_adapter_capability(GObject* object, const char* ifname, char** capability,

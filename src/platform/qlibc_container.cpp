@@ -1,5 +1,6 @@
 #include "platform/qlibc_container.h"
 
+#include <algorithm>
 #include <new>
 #include <string>
 #include <unordered_map>
@@ -29,8 +30,9 @@ template <typename T, typename Items>
 T* Allocate(int capacity, Items T::*items) {
     try {
         T* container = new T();
-        if (capacity > 0 && capacity <= 4096) {
-            (container->*items).reserve(static_cast<size_t>(capacity));
+        constexpr size_t kPageWorth = 4096 / sizeof(typename Items::value_type);
+        if (capacity > 0) {
+            (container->*items).reserve(std::min(static_cast<size_t>(capacity), kPageWorth));
         }
         return container;
     } catch (const std::bad_alloc&) {

@@ -265,6 +265,7 @@ TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
     config["schedule_enabled"] = true;
     config["schedule"] = std::string(168, '0');
     ASSERT_EQ(vornwireless::dbus::WifiClient().ApplyAdapter("wlan0", config), 0);
+    EXPECT_EQ(Parsed(Call("GetAdapterConfig", "wlan0")), config);  // no stale reply
     ASSERT_TRUE(wifid_->Signal(SIGTERM));
     EXPECT_EQ(wifid_->WaitForExit(kExitTimeout), 0) << wifid_->Stderr();
     EXPECT_THAT(wifid_->Stderr(), AllOf(HasSubstr("Stopping on signal"), HasSubstr("Stopped")));

@@ -474,6 +474,10 @@ AdapterConfig Adapter::GetConfig() const {
     return data_ ? data_->GetConfig() : AdapterConfig();
 }
 
+std::uint64_t Adapter::GetConfigRevision() const {
+    return data_ ? data_->Revision() : 0;
+}
+
 int Adapter::ScanNetworks(std::vector<AdapterConfig::StationInfo>& stations) {
     return HasNullMember() ? -1 : agent_->ScanNetworks(data_->GetConfig(), stations);
 }

@@ -2,6 +2,7 @@
 #define VORN_WIFI_ADAPTER_ADAPTER_H
 
 #include <chrono>
+#include <cstdint>
 #include <ctime>
 #include <memory>
 #include <mutex>
@@ -73,6 +74,8 @@ class Adapter {
     int Terminate();
     WIFI_STATUS GetStatus() const;
     AdapterConfig GetConfig() const;
+    // See AdapterData::Revision; 0 while the adapter has no data.
+    std::uint64_t GetConfigRevision() const;
     const AdapterCapability* GetCapability() const { return capability_.get(); }
     int ScanNetworks(std::vector<AdapterConfig::StationInfo>& stations);
     int LoadStationConnData(std::vector<utils::ConnectionInfo>& connections);

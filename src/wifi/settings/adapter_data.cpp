@@ -1,5 +1,6 @@
 #include "wifi/settings/adapter_data.h"
 
+#include <atomic>
 #include <map>
 #include <utility>
 #include <vector>
@@ -227,6 +228,12 @@ void SetFirstStartDefaults(AdapterConfig& c, WIFI_MODE mode) {
 
 AdapterData::AdapterData(const std::string& name) : config_(new AdapterConfig()) {
     config_->name = name;
+    NewRevision();
+}
+
+void AdapterData::NewRevision() {
+    static std::atomic<std::uint64_t> last{0};
+    revision_ = ++last;
 }
 
 AdapterData::~AdapterData() = default;
@@ -265,6 +272,7 @@ int AdapterData::Read() {
         return -1;
     }
     *config_ = config;
+    NewRevision();
     return 0;
 }
 
@@ -466,6 +474,7 @@ int AdapterData::SetConfig(const AdapterConfig& config) {
     }
     *config_ = config;
     config_->stations = stations;
+    NewRevision();
     return 0;
 }
 
@@ -505,6 +514,7 @@ int AdapterData::SetAPConfig(const AdapterConfig& n) {
     }
     c.schedule = n.schedule;
     c.guest_schedule = n.guest_schedule;
+    NewRevision();
     return 0;
 }
 
@@ -522,6 +532,7 @@ int AdapterData::SetClientConfig(const AdapterConfig& config) {
         }
     }
     known.push_back(station);
+    NewRevision();
     return 0;
 }
 

@@ -1,6 +1,7 @@
 #ifndef VORN_WIFI_SETTINGS_ADAPTER_DATA_H
 #define VORN_WIFI_SETTINGS_ADAPTER_DATA_H
 
+#include <cstdint>
 #include <memory>
 #include <string>
 
@@ -42,6 +43,9 @@ class AdapterData {
     AdapterData& operator=(const AdapterData&) = delete;
 
     const AdapterConfig& GetConfig() const { return *config_; }
+    // Changes whenever the configuration may have; no two configurations of any adapter in this
+    // process share one, so it can key a cache of what is derived from the configuration.
+    std::uint64_t Revision() const { return revision_; }
     RELOAD_STATUS GetReloadStatus() const { return reload_; }
     void ResetReloadStatus() { reload_ = RELOAD_STATUS(); }
     void EnableReloadStatus() { reload_ = RELOAD_STATUS{true, true, true, true, true}; }
@@ -69,8 +73,11 @@ class AdapterData {
     void WriteMacFilter() const;
     void WriteClient() const;
 
+    void NewRevision();
+
     std::unique_ptr<AdapterConfig> config_;
     RELOAD_STATUS reload_;
+    std::uint64_t revision_ = 0;
 };
 
 }  // namespace wifi
