@@ -2,6 +2,8 @@
 
 #include <sys/stat.h>
 
+#include <algorithm>
+#include <cctype>
 #include <fstream>
 #include <sstream>
 
@@ -11,6 +13,8 @@
 #include "platform/vorn_schedule.h"
 #include "utils/interface_name.h"
 #include "utils/log.h"
+#include "wifi/adapter/adapter.h"
+#include "wifi/bridge/bridge_base.h"
 
 namespace vornwireless {
 namespace wifi {
@@ -19,6 +23,8 @@ namespace {
 constexpr const char* kGuestScript = "/usr/vorn/etc/iptables_guest_net.sh";
 constexpr const char* kTool = "/usr/vorn/bin/vornwireless";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
+constexpr const char* kLocalBridge = "lbr0";
+constexpr std::string::size_type kMacLength = 17;
 
 int RunGuestScript(const char* action, const char* what, const std::string& ifname) {
     return QLIBCExecl(kGuestScript, kExecFlags, action, what,
@@ -38,6 +44,102 @@ bool CopyTool(const std::string& target) {
 }
 
 }  // namespace
+
+int AdapterAgentAP::Enable(const AdapterConfig& config) {
+    if (EnableAP(config) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to enable AP for [%s]", GetName().c_str());
+        return -1;
+    }
+    AfterEnableAP(config);
+    if (EnableRuleGuest(config) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to Enable guest access rule");
+        return -1;
+    }
+    if (SetSchedule(config) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to set schedule for [%s]", GetName().c_str());
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentAP::Disable(const AdapterConfig& config) {
+    if (RemoveSchedule(config) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to remove schedule for [%s]", GetName().c_str());
+        return -1;
+    }
+    if (DisableRuleGuest(config) != 0) {
+        VORN_LOG(LOG_ERR, "Failed tO Disable guest access rule");
+        return -1;
+    }
+    if (DisableAP(config) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to Disable AP for [%s]", GetName().c_str());
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentAP::ReloadRouter(const AdapterConfig& config, RELOAD_STATUS status) {
+    if (status.restart) {
+        DisableAP(config);
+        EnableAP(config);
+        RepairLocalBridge(config);
+        status.restart = false;
+    }
+    return AdapterAgentAP::Reload(config, status);
+}
+
+int AdapterAgentAP::RepairLocalBridge(const AdapterConfig& config) {
+    const std::string bridgeMac = utils::GetBssid(kLocalBridge);
+    std::string member;
+    utils::GetFirstExistentSlaveByBridge(kLocalBridge, member);
+    if (config.enabled && member.empty()) {
+        if (bridgeMac.compare(0, kMacLength, config.bssid.ToString()) == 0) {
+            return 0;
+        }
+        // The MAC reaches a command line.
+        if (!config.bssid.IsFormalized() ||
+            QLIBCExecl("/sbin/ip", QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN, "link", "set",
+                       kLocalBridge, "address", config.bssid.ToCString(), nullptr) != 0) {
+            VORN_LOG(LOG_ERR, "Failed to execute [ip]");
+            return -1;
+        }
+        return 0;
+    }
+    BridgeBase* bridge = BridgeBase::GetBridge(kLocalBridge);
+    if (bridge == nullptr) {
+        VORN_LOG(LOG_ERR, "The bridge [%s] is not exist", kLocalBridge);
+        return -1;
+    }
+    if (bridge->ResetBridgeIP() != 0) {
+        VORN_LOG(LOG_ERR, "Failed to reset lbr0 ip");
+        return -1;
+    }
+    return 0;
+}
+
+void AdapterAgentAP::AddConnections(std::vector<utils::ConnectionInfo> stations,
+                                    std::vector<utils::ConnectionInfo>& connections) {
+    // Only the router topology runs the DHCP server whose leases name the stations.
+    const bool leases = Adapter::IsTopology(WIFI_TOPOLOGY_ROUTER);
+    for (utils::ConnectionInfo& station : stations) {
+        if (utils::GetArpInfoByMAC(station.mac, station.ip) != 0) {
+            VORN_LOG(LOG_ERR, "Failed to get ip and hostname for mac [%s], skip it",
+                     station.mac.ToCString());
+            continue;
+        }
+        if (leases) {
+            utils::GetDHCPInfoByMAC(station.mac, station.hostname);
+        }
+        connections.push_back(station);
+    }
+}
+
+// The daemons' command tools join their words into one command split at blanks.
+bool AdapterAgentAP::IsWpsPin(const std::string& pin) {
+    return (pin.size() == 4 || pin.size() == 8) && std::all_of(pin.begin(), pin.end(), [](char c) {
+               return std::isdigit(static_cast<unsigned char>(c)) != 0;
+           });
+}
 
 int AdapterAgentAP::Reload(const AdapterConfig& config, RELOAD_STATUS status) {
     if (status.restart) {

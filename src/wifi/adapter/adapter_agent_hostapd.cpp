@@ -324,13 +324,6 @@ std::vector<utils::ConnectionInfo> ParseStations(const std::vector<std::string>&
     return stations;
 }
 
-// hostapd_cli joins its words into one control command split at blanks.
-bool IsWpsPin(const std::string& pin) {
-    return (pin.size() == 4 || pin.size() == 8) && std::all_of(pin.begin(), pin.end(), [](char c) {
-               return std::isdigit(static_cast<unsigned char>(c)) != 0;
-           });
-}
-
 }  // namespace
 
 int AdapterAgentHostapd::GenerateMacFilterConfig(const AdapterConfig& config) {
@@ -433,19 +426,7 @@ int AdapterAgentHostapd::LoadStationConnData(std::vector<utils::ConnectionInfo>&
         VORN_LOG(LOG_ERR, "Failed to execute cmd [%s]", command.c_str());
         return -1;
     }
-    // Only the router topology runs the DHCP server whose leases name the stations.
-    const bool leases = Adapter::IsTopology(WIFI_TOPOLOGY_ROUTER);
-    for (utils::ConnectionInfo& station : ParseStations(lines)) {
-        if (utils::GetArpInfoByMAC(station.mac, station.ip) != 0) {
-            VORN_LOG(LOG_ERR, "Failed to get ip and hostname for mac [%s], skip it",
-                     station.mac.ToCString());
-            continue;
-        }
-        if (leases) {
-            utils::GetDHCPInfoByMAC(station.mac, station.hostname);
-        }
-        connections.push_back(station);
-    }
+    AddConnections(ParseStations(lines), connections);
     return 0;
 }
 
@@ -473,39 +454,6 @@ int AdapterAgentHostapd::EnableWPSWithPinCode(const std::string& pin) {
                    "120", nullptr) != 0) {
         VORN_LOG(LOG_ERR, "Failed to execute %s wps_pin %s (%s)", kHostapdCli, "any",
                  GetName().c_str());
-        return -1;
-    }
-    return 0;
-}
-
-int AdapterAgentHostapd::Enable(const AdapterConfig& config) {
-    if (EnableAP(config) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to enable AP for [%s]", GetName().c_str());
-        return -1;
-    }
-    SetTXPower(config);
-    if (EnableRuleGuest(config) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to Enable guest access rule");
-        return -1;
-    }
-    if (SetSchedule(config) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to set schedule for [%s]", GetName().c_str());
-        return -1;
-    }
-    return 0;
-}
-
-int AdapterAgentHostapd::Disable(const AdapterConfig& config) {
-    if (RemoveSchedule(config) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to remove schedule for [%s]", GetName().c_str());
-        return -1;
-    }
-    if (DisableRuleGuest(config) != 0) {
-        VORN_LOG(LOG_ERR, "Failed tO Disable guest access rule");
-        return -1;
-    }
-    if (DisableAP(config) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to Disable AP for [%s]", GetName().c_str());
         return -1;
     }
     return 0;

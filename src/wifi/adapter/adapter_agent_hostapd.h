@@ -14,10 +14,6 @@ namespace wifi {
 // connected stations and triggers WPS. The topology classes derive from it.
 class AdapterAgentHostapd : public AdapterAgentAP {
   public:
-    // EnableAP, transmit power (its failure ignored), guest rules, schedule.
-    int Enable(const AdapterConfig& config) override;
-    int Recover(const AdapterConfig& config) override { return Enable(config); }
-    int Disable(const AdapterConfig& config) override;
     // Enabled while the interface is up and running.
     WIFI_STATUS GetStatus(const AdapterConfig& config) const override;
     int ScanNetworks(const AdapterConfig&, std::vector<AdapterConfig::StationInfo>&) override {
@@ -45,7 +41,8 @@ class AdapterAgentHostapd : public AdapterAgentAP {
   protected:
     explicit AdapterAgentHostapd(const std::string& name) : AdapterAgentAP(name) {}
 
-  private:
+    // hostapd starts the radio at full power.
+    void AfterEnableAP(const AdapterConfig& config) override { SetTXPower(config); }
 };
 
 }  // namespace wifi

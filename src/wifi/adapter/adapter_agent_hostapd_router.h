@@ -14,12 +14,9 @@ class AdapterAgentHostapdRouter : public AdapterAgentHostapd {
     explicit AdapterAgentHostapdRouter(const std::string& name) : AdapterAgentHostapd(name) {}
 
     // As every access point, with lbr0 repaired right after a restart.
-    int Reload(const AdapterConfig& config, RELOAD_STATUS status) override;
-
-  private:
-    // A restarted access point leaves lbr0 without its address: an empty lbr0 keeps the radio's
-    // MAC, otherwise the bridge gets its IP address back.
-    int RepairLocalBridge(const AdapterConfig& config);
+    int Reload(const AdapterConfig& config, RELOAD_STATUS status) override {
+        return ReloadRouter(config, status);
+    }
 };
 
 }  // namespace wifi

@@ -1,1 +1,0 @@
-#include "wifi/adapter/adapter_agent_hostapd_bridge.h"
