@@ -8,6 +8,7 @@
 #include "wifi/adapter/adapter_agent_client.h"
 #include "wifi/adapter/adapter_agent_hostapd_bridge.h"
 #include "wifi/adapter/adapter_agent_hostapd_router.h"
+#include "wifi/adapter/adapter_agent_rlt.h"
 #include "wifi/settings/enum_map.h"
 
 namespace vornwireless {
@@ -67,12 +68,16 @@ AdapterAgent* AdapterAgent::Create(const AdapterConfig& config) {
             return new AdapterAgentHostapdBridge(config.name);
         case Kind::kClient:
             return new AdapterAgentClient(config.name);
+        case Kind::kRLTRouter:
+            return new AdapterAgentRLTRouter(config.name);
+        case Kind::kRLTBridge:
+            return new AdapterAgentRLTBridge(config.name);
         case Kind::kNone:
             return nullptr;
         default:
             break;
     }
-    // The RLT agents are not part of this build yet.
+    // The RLT radio's station agent is not part of this build yet.
     VORN_LOG(LOG_ERR, "No %s agent for [%s] in this build", KindName(kind), config.name.c_str());
     return nullptr;
 }
