@@ -16,7 +16,9 @@ namespace vornwireless {
 namespace wifi {
 namespace {
 
+using ::testing::Contains;
 using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using Kind = AdapterAgent::Kind;
 
@@ -114,9 +116,10 @@ TEST_F(AdapterTest, AgentChoiceByDriverModelAndTopology) {
     config.name = "wlan1";
     EXPECT_EQ(AdapterAgent::Choose(config, WIFI_TOPOLOGY_BRIDGE), Kind::kHostapdBridge);
 
-    // No concrete agent yet: the adapter is not made, and says why.
-    EXPECT_EQ(Adapter::AddAdapter("wlan0"), -1);
-    EXPECT_TRUE(log_.Contains("No rlt router agent for [wlan0] in this build"));
+    // In router topology the RLT radio comes up through its driver's profile.
+    EXPECT_EQ(Adapter::AddAdapter("wlan0"), 0);
+    EXPECT_THAT(root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi.conf"), HasSubstr("\nSSID1="));
+    EXPECT_THAT(root_.Calls(), Contains("/sbin/ifconfig wlan0 up"));
     EXPECT_EQ(Adapter::RefreshAdapterList(), 0);
     EXPECT_EQ(root_.ReadFile("/etc/vorninfo.conf").find("support_net_topology=\"yes\"") !=
                   std::string::npos,
