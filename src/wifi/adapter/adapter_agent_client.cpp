@@ -44,10 +44,6 @@ constexpr int kDownAttempts = 3;
 constexpr std::size_t kMaxSsidBytes = 32;
 constexpr std::size_t kStateBytes = 128;
 // A few hundred networks in range at most; a line of the listing is well under 128 bytes.
-constexpr std::size_t kMaxScanLines = 512;
-constexpr std::size_t kScanLineBytes = 256;
-constexpr int kMaxChannel = 200;
-constexpr int kMaxSignal = 100;
 
 bool IsPrintableAscii(unsigned char c) {
     return c >= 0x20 && c < 0x7f;
@@ -79,17 +75,6 @@ std::string ToHex(const std::string& bytes) {
         hex += kDigits[byte & 0x0f];
     }
     return hex;
-}
-
-bool FromHex(const std::string& hex, std::string& bytes) {
-    if (hex.size() % 2 != 0 || !IsHex(hex)) {
-        return false;
-    }
-    bytes.clear();
-    for (std::size_t i = 0; i < hex.size(); i += 2) {
-        bytes += static_cast<char>(std::stoi(hex.substr(i, 2), nullptr, 16));
-    }
-    return true;
 }
 
 bool Refuse(const char* what) {
@@ -196,48 +181,6 @@ bool AddBssid(const vornwireless::utils::MacAddress& bssid, std::string& text) {
     return true;
 }
 
-// Printable words only: a scan word may reach a log line.
-bool IsWord(const std::string& word) {
-    return std::all_of(word.begin(), word.end(),
-                       [](char c) { return std::isgraph(static_cast<unsigned char>(c)) != 0; });
-}
-
-bool ParseScanLine(const std::string& line, StationInfo& station) {
-    std::istringstream in(line);
-    std::string words[7];
-    for (std::string& word : words) {
-        if (!(in >> word) || !IsWord(word)) {
-            return false;
-        }
-    }
-    std::string extra;
-    if (in >> extra) {
-        return false;
-    }
-    station.bssid = vornwireless::utils::MacAddress(words[0]);
-    if (!station.bssid.IsFormalized() ||
-        !vornwireless::utils::ParseDecimal(words[1], station.channel) || station.channel < 0 ||
-        station.channel > kMaxChannel ||
-        !vornwireless::utils::ParseDecimal(words[2], station.signal) || station.signal < 0 ||
-        station.signal > kMaxSignal || !FromHex(words[6], station.essid) || station.essid.empty() ||
-        station.essid.size() > kMaxSsidBytes) {
-        return false;
-    }
-    station.opmode = EnumMap<WIFI_OPMODE>::StringToEnum(words[3]);
-    station.hwmode = EnumMap<WIFI_MODE>::StringToEnum(words[4]);
-    if (station.opmode == WIFI_OPMODE_ERROR || station.hwmode == WIFI_MODE_ERROR) {
-        return false;
-    }
-    if (AdapterAgentClientBase::ParseSecurityEncryption(words[5], station.security,
-                                                        station.encryption) != 0) {
-        VORN_LOG(LOG_ERR, "Failed on parsing security and encryption from string [%s]",
-                 words[5].c_str());
-        return false;
-    }
-    station.is_dhcp = true;
-    return true;
-}
-
 }  // namespace
 
 std::string AdapterAgentClient::ConfigFile(const std::string& ifname) {
@@ -262,23 +205,6 @@ int AdapterAgentClient::WpaSupplicantConfigText(const StationInfo& station, std:
     }
     text = built + "}\n";
     return 0;
-}
-
-std::vector<StationInfo> AdapterAgentClient::ParseScanList(const std::vector<std::string>& lines) {
-    std::vector<StationInfo> stations;
-    std::size_t refused = 0;
-    for (const std::string& line : lines) {
-        StationInfo station;
-        if (ParseScanLine(line, station)) {
-            stations.push_back(station);
-        } else {
-            ++refused;
-        }
-    }
-    if (refused != 0) {
-        VORN_LOG(LOG_INFO, "Left out %zu scan lines of unknown form", refused);
-    }
-    return stations;
 }
 
 int AdapterAgentClient::SetWpaSupplicantConfig() const {
@@ -438,26 +364,11 @@ int AdapterAgentClient::DoDisconnect() {
     return 0;
 }
 
-int AdapterAgentClient::GetClientConfig(const AdapterConfig& config) {
-    if (config.stations.empty()) {
-        VORN_LOG(LOG_ERR, "No network to join for [%s]", GetName().c_str());
-        return -1;
-    }
-    SetStation(config.stations.back());
-    return 0;
-}
-
 int AdapterAgentClient::ClientRecover(const AdapterConfig& config) {
     if (SupplicantPid() != 0 && WpaState() == "COMPLETED") {
         return 0;
     }
     return ClientEnable(config);
-}
-
-int AdapterAgentClient::ClientDisable(const AdapterConfig&) {
-    const int disconnected = DoDisconnect();
-    const int removed = RemoveGateway();
-    return disconnected == 0 && removed == 0 ? 0 : -1;
 }
 
 WIFI_STATUS AdapterAgentClient::GetStatus(const AdapterConfig& config) const {
@@ -468,39 +379,6 @@ WIFI_STATUS AdapterAgentClient::GetStatus(const AdapterConfig& config) const {
         return IpStatus();
     }
     return SupplicantPid() != 0 ? WIFI_STATUS_ENABLING : WIFI_STATUS_DISABLED;
-}
-
-int AdapterAgentClient::ScanNetworks(const AdapterConfig& config,
-                                     std::vector<StationInfo>& stations) {
-    if (!IsNameValid()) {
-        return -1;
-    }
-    if (!utils::IsNetActivate(GetName()) &&
-        QLIBCExecl(kIfconfig, kExecFlags, GetName().c_str(), "up", nullptr) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to enable interface [%s]", GetName().c_str());
-        return -1;
-    }
-    if (QuickScanNetworks(config, stations) != 0) {
-        VORN_LOG(LOG_ERR, "Failed on doing network scan");
-        return -1;
-    }
-    return 0;
-}
-
-int AdapterAgentClient::QuickScanNetworks(const AdapterConfig&,
-                                          std::vector<StationInfo>& stations) {
-    if (!IsNameValid()) {
-        return -1;
-    }
-    const std::string command = "/sbin/iwlist " + GetName() + " scanning vorn";
-    std::vector<std::string> lines;
-    if (vorn::platform::ReadShellCommandLines(command, lines, kMaxScanLines, kScanLineBytes) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to popen '%s', errno=%d", command.c_str(), errno);
-        return -1;
-    }
-    const std::vector<StationInfo> found = ParseScanList(lines);
-    stations.insert(stations.end(), found.begin(), found.end());
-    return 0;
 }
 
 }  // namespace wifi

@@ -17,16 +17,8 @@ class AdapterAgentClient : public AdapterAgentClientBase {
     // Enabled once associated (or the address status after it), Enabling while the supplicant
     // runs unassociated, else Disabled.
     WIFI_STATUS GetStatus(const AdapterConfig& config) const override;
-    // Brings the interface up when it is down, then QuickScanNetworks.
-    int ScanNetworks(const AdapterConfig& config,
-                     std::vector<AdapterConfig::StationInfo>& stations) override;
-    int QuickScanNetworks(const AdapterConfig& config,
-                          std::vector<AdapterConfig::StationInfo>& stations) override;
-    // The network last added to the stored stations.
-    int GetClientConfig(const AdapterConfig& config) override;
     // Nothing while the supplicant is associated, else ClientEnable.
     int ClientRecover(const AdapterConfig& config) override;
-    int ClientDisable(const AdapterConfig& config) override;
     int AdHocEnable(const AdapterConfig& config) override { return ClientEnable(config); }
     int AdHocRecover(const AdapterConfig& config) override { return ClientRecover(config); }
     int AdHocDisable(const AdapterConfig&) override { return DoDisconnect(); }
@@ -41,10 +33,6 @@ class AdapterAgentClient : public AdapterAgentClientBase {
     // outside printable ASCII is written as hex digits.
     static int WpaSupplicantConfigText(const AdapterConfig::StationInfo& station,
                                        std::string& text);
-    // One network per line of "iwlist IF scanning vorn" (docs/wifi.md): "BSSID CHANNEL SIGNAL
-    // MODE HWMODE SECURITY ESSID-HEX". Lines that are not of that form are left out.
-    static std::vector<AdapterConfig::StationInfo> ParseScanList(
-        const std::vector<std::string>& lines);
 
     static std::string ConfigFile(const std::string& ifname);
     static std::string PidFile(const std::string& ifname);

@@ -4,9 +4,12 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
+#include <cctype>
 #include <cerrno>
 #include <cstring>
 #include <random>
+#include <sstream>
 #include <thread>
 #include <vector>
 
@@ -14,6 +17,7 @@
 #include "platform/qlibc_file.h"
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
+#include "platform/shell_command.h"
 #include "platform/text_file.h"
 #include "platform/vorn_net.h"
 #include "utils/dbus_client.h"
@@ -21,6 +25,7 @@
 #include "utils/interface_name.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
+#include "wifi/settings/enum_map.h"
 
 namespace vornwireless {
 namespace wifi {
@@ -112,6 +117,70 @@ bool CopyField(const std::string& text, char* field, std::size_t size) {
         return false;
     }
     std::memcpy(field, text.c_str(), text.size() + 1);
+    return true;
+}
+
+constexpr const char* kIfconfig = "/sbin/ifconfig";
+using StationInfo = AdapterConfig::StationInfo;
+constexpr std::size_t kMaxScanLines = 512;
+constexpr std::size_t kScanLineBytes = 256;
+constexpr int kMaxChannel = 200;
+constexpr int kMaxSignal = 100;
+constexpr std::size_t kMaxSsidBytes = 32;
+
+bool FromHex(const std::string& hex, std::string& bytes) {
+    const bool digits = std::all_of(hex.begin(), hex.end(), [](char c) {
+        return std::isxdigit(static_cast<unsigned char>(c)) != 0;
+    });
+    if (hex.size() % 2 != 0 || !digits) {
+        return false;
+    }
+    bytes.clear();
+    for (std::size_t i = 0; i < hex.size(); i += 2) {
+        bytes += static_cast<char>(std::stoi(hex.substr(i, 2), nullptr, 16));
+    }
+    return true;
+}
+
+// Printable words only: a scan word may reach a log line.
+bool IsWord(const std::string& word) {
+    return std::all_of(word.begin(), word.end(),
+                       [](char c) { return std::isgraph(static_cast<unsigned char>(c)) != 0; });
+}
+
+bool ParseScanLine(const std::string& line, StationInfo& station) {
+    std::istringstream in(line);
+    std::string words[7];
+    for (std::string& word : words) {
+        if (!(in >> word) || !IsWord(word)) {
+            return false;
+        }
+    }
+    std::string extra;
+    if (in >> extra) {
+        return false;
+    }
+    station.bssid = vornwireless::utils::MacAddress(words[0]);
+    if (!station.bssid.IsFormalized() ||
+        !vornwireless::utils::ParseDecimal(words[1], station.channel) || station.channel < 0 ||
+        station.channel > kMaxChannel ||
+        !vornwireless::utils::ParseDecimal(words[2], station.signal) || station.signal < 0 ||
+        station.signal > kMaxSignal || !FromHex(words[6], station.essid) || station.essid.empty() ||
+        station.essid.size() > kMaxSsidBytes) {
+        return false;
+    }
+    station.opmode = EnumMap<WIFI_OPMODE>::StringToEnum(words[3]);
+    station.hwmode = EnumMap<WIFI_MODE>::StringToEnum(words[4]);
+    if (station.opmode == WIFI_OPMODE_ERROR || station.hwmode == WIFI_MODE_ERROR) {
+        return false;
+    }
+    if (AdapterAgentClientBase::ParseSecurityEncryption(words[5], station.security,
+                                                        station.encryption) != 0) {
+        VORN_LOG(LOG_ERR, "Failed on parsing security and encryption from string [%s]",
+                 words[5].c_str());
+        return false;
+    }
+    station.is_dhcp = true;
     return true;
 }
 
@@ -344,6 +413,72 @@ int AdapterAgentClientBase::ParseSecurityEncryption(const std::string& word,
         encryption = WIFI_ENCRYPTION_ERROR;
         return -1;
     }
+    return 0;
+}
+
+std::vector<StationInfo> AdapterAgentClientBase::ParseScanList(
+    const std::vector<std::string>& lines) {
+    std::vector<StationInfo> stations;
+    std::size_t refused = 0;
+    for (const std::string& line : lines) {
+        StationInfo station;
+        if (ParseScanLine(line, station)) {
+            stations.push_back(station);
+        } else {
+            ++refused;
+        }
+    }
+    if (refused != 0) {
+        VORN_LOG(LOG_INFO, "Left out %zu scan lines of unknown form", refused);
+    }
+    return stations;
+}
+
+int AdapterAgentClientBase::GetClientConfig(const AdapterConfig& config) {
+    if (config.stations.empty()) {
+        VORN_LOG(LOG_ERR, "No network to join for [%s]", GetName().c_str());
+        return -1;
+    }
+    SetStation(config.stations.back());
+    return 0;
+}
+
+int AdapterAgentClientBase::ClientDisable(const AdapterConfig&) {
+    const int disconnected = DoDisconnect();
+    const int removed = RemoveGateway();
+    return disconnected == 0 && removed == 0 ? 0 : -1;
+}
+
+int AdapterAgentClientBase::ScanNetworks(const AdapterConfig& config,
+                                         std::vector<StationInfo>& stations) {
+    if (!IsNameValid()) {
+        return -1;
+    }
+    if (!utils::IsNetActivate(GetName()) &&
+        QLIBCExecl(kIfconfig, kExecFlags, GetName().c_str(), "up", nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to enable interface [%s]", GetName().c_str());
+        return -1;
+    }
+    if (QuickScanNetworks(config, stations) != 0) {
+        VORN_LOG(LOG_ERR, "Failed on doing network scan");
+        return -1;
+    }
+    return 0;
+}
+
+int AdapterAgentClientBase::QuickScanNetworks(const AdapterConfig&,
+                                              std::vector<StationInfo>& stations) {
+    if (!IsNameValid()) {
+        return -1;
+    }
+    const std::string command = "/sbin/iwlist " + GetName() + " scanning vorn";
+    std::vector<std::string> lines;
+    if (vorn::platform::ReadShellCommandLines(command, lines, kMaxScanLines, kScanLineBytes) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to popen '%s', errno=%d", command.c_str(), errno);
+        return -1;
+    }
+    const std::vector<StationInfo> found = ParseScanList(lines);
+    stations.insert(stations.end(), found.begin(), found.end());
     return 0;
 }
 

@@ -26,15 +26,20 @@ class AdapterAgentClientBase : public AdapterAgent {
     int EnableWPSWithPBC() override;
     int EnableWPSWithPinCode(const std::string& pin) override;
 
+    // Brings the interface up when it is down, then QuickScanNetworks.
+    int ScanNetworks(const AdapterConfig& config,
+                     std::vector<AdapterConfig::StationInfo>& stations) override;
+    // The networks of "iwlist IF scanning vorn", added to stations.
     virtual int QuickScanNetworks(const AdapterConfig& config,
-                                  std::vector<AdapterConfig::StationInfo>& stations) = 0;
-    // Takes the network to join from the configuration; -1 when it has none.
-    virtual int GetClientConfig(const AdapterConfig& config) = 0;
+                                  std::vector<AdapterConfig::StationInfo>& stations);
+    // Takes the network to join from the configuration, the one last added to the stored
+    // stations; -1 when it has none.
+    virtual int GetClientConfig(const AdapterConfig& config);
     // Disconnect, connect, then the serialised restart of the network services.
     virtual int ClientEnable(const AdapterConfig& config);
     virtual int ClientRecover(const AdapterConfig& config) = 0;
     // Disconnects and leaves client topology: the gateway record and multi-gateway rules go.
-    virtual int ClientDisable(const AdapterConfig& config) = 0;
+    virtual int ClientDisable(const AdapterConfig& config);
     virtual int AdHocEnable(const AdapterConfig& config) = 0;
     virtual int AdHocRecover(const AdapterConfig& config) = 0;
     virtual int AdHocDisable(const AdapterConfig& config) = 0;
@@ -43,6 +48,10 @@ class AdapterAgentClientBase : public AdapterAgent {
 
     // The security word of a scan entry (e.g. "WPA1WPA2PSKTKIPAES"). 0, or -1 (logged) when
     // either part cannot be told.
+    // One network per line of "iwlist IF scanning vorn" (docs/wifi.md): "BSSID CHANNEL SIGNAL
+    // MODE HWMODE SECURITY ESSID-HEX". Lines that are not of that form are left out.
+    static std::vector<AdapterConfig::StationInfo> ParseScanList(
+        const std::vector<std::string>& lines);
     static int ParseSecurityEncryption(const std::string& word, WIFI_SECURITY& security,
                                        WIFI_ENCRYPTION& encryption);
     // The pause between two polls of a running program (1 s; tests shorten it).
