@@ -6,6 +6,7 @@
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
 #include "wifi/adapter/adapter_agent_client.h"
+#include "wifi/adapter/adapter_agent_client_rlt.h"
 #include "wifi/adapter/adapter_agent_hostapd_bridge.h"
 #include "wifi/adapter/adapter_agent_hostapd_router.h"
 #include "wifi/adapter/adapter_agent_rlt.h"
@@ -16,26 +17,6 @@ namespace wifi {
 namespace {
 
 constexpr const char* kRfkill = "/usr/vorn/sbin/rfkill";
-
-const char* KindName(AdapterAgent::Kind kind) {
-    switch (kind) {
-        case AdapterAgent::Kind::kHostapdBridge:
-            return "hostapd bridge";
-        case AdapterAgent::Kind::kHostapdRouter:
-            return "hostapd router";
-        case AdapterAgent::Kind::kRLTBridge:
-            return "rlt bridge";
-        case AdapterAgent::Kind::kRLTRouter:
-            return "rlt router";
-        case AdapterAgent::Kind::kClient:
-            return "client";
-        case AdapterAgent::Kind::kClientRLT:
-            return "rlt client";
-        case AdapterAgent::Kind::kNone:
-            break;
-    }
-    return "none";
-}
 
 }  // namespace
 
@@ -72,13 +53,11 @@ AdapterAgent* AdapterAgent::Create(const AdapterConfig& config) {
             return new AdapterAgentRLTRouter(config.name);
         case Kind::kRLTBridge:
             return new AdapterAgentRLTBridge(config.name);
+        case Kind::kClientRLT:
+            return new AdapterAgentClientRLT(config.name);
         case Kind::kNone:
-            return nullptr;
-        default:
             break;
     }
-    // The RLT radio's station agent is not part of this build yet.
-    VORN_LOG(LOG_ERR, "No %s agent for [%s] in this build", KindName(kind), config.name.c_str());
     return nullptr;
 }
 

@@ -346,13 +346,11 @@ int AdapterAgentClient::DoDisconnect() {
     if (!IsNameValid()) {
         return -1;
     }
-    const std::string iface = "IFACE=" + GetName();
     if (DisconnectKillWpa() != 0) {
         VORN_LOG(LOG_ERR, "Failed to disconnect on kill wpa part");
         return -1;
     }
-    if (QLIBCExecl("/sbin/stop", kQuietFlags, "dhcp-client", iface.c_str(), nullptr) != 0) {
-        VORN_LOG(LOG_ERR, "unable to stop dhcp-client instance on %s", GetName().c_str());
+    if (StopDhcpClient() != 0) {
         VORN_LOG(LOG_ERR, "Failed to disconnect on kill dhcp part");
         return -1;
     }

@@ -482,5 +482,15 @@ int AdapterAgentClientBase::QuickScanNetworks(const AdapterConfig&,
     return 0;
 }
 
+int AdapterAgentClientBase::StopDhcpClient() const {
+    const std::string iface = "IFACE=" + GetName();
+    if (QLIBCExecl("/sbin/stop", kExecFlags | QLIBC_EXEC_NO_STDERR, "dhcp-client", iface.c_str(),
+                   nullptr) != 0) {
+        VORN_LOG(LOG_ERR, "unable to stop dhcp-client instance on %s", GetName().c_str());
+        return -1;
+    }
+    return 0;
+}
+
 }  // namespace wifi
 }  // namespace vornwireless

@@ -72,6 +72,8 @@ class AdapterAgentClientBase : public AdapterAgent {
     // network that gets none a random one of 10.42.43.0/24; each chosen address is checked for
     // another host answering for it first. Sets the IP status GetStatus reports. 0 or -1.
     int SetupAddress();
+    // Stops the DHCP client instance of the interface.
+    int StopDhcpClient() const;
     // Announces the loss of the interface's IPv4 gateway and its multi-gateway routes.
     int RemoveGateway() const;
     WIFI_STATUS IpStatus() const { return ipStatus_; }

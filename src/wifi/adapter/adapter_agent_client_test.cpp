@@ -10,6 +10,7 @@
 
 #include "support/sim_root.h"
 #include "wifi/adapter/adapter.h"
+#include "wifi/adapter/adapter_agent_client_rlt.h"
 #include "wifi/utils/station_utils.h"
 
 extern char** environ;
@@ -269,6 +270,69 @@ TEST_F(AdapterAgentClientTest, SwitchIntoClientTopologyConnectsWithoutWaitingFor
                !root_.Exists("/tmp/restart_services_pid");
     }));
     Adapter::DeleteAdapterAll();
+}
+
+// The RLT radio's station: its file by scheme, refused texts, the driver reload before the join
+// and the way out.
+TEST_F(AdapterAgentClientTest, RltStationFileJoinAndLeave) {
+    const auto text = [](const StationInfo& station) {
+        std::string built;
+        return AdapterAgentClientRLT::StationConfigText(station, built) == 0 ? built : "refused";
+    };
+    EXPECT_EQ(text(Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "secret99")),
+              "Default\nApCliEnable=1\nApCliSsid=home\nApCliBssid=02:00:00:00:00:01\n"
+              "ApCliAuthMode=WPA2PSK\nApCliEncrypType=AES\nApCliWPAPSK=secret99\n");
+    EXPECT_THAT(text(Network(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_ERROR, "0a1b2c3d4e")),
+                HasSubstr("ApCliAuthMode=SHARED\nApCliEncrypType=WEP\nApCliDefaultKeyID=1\n"
+                          "ApCliKey1Type=0\nApCliKey1Str=0a1b2c3d4e\n"));
+    EXPECT_THAT(
+        text(Network(WIFI_SECURITY_PERSONAL_WPA_MIXED, WIFI_ENCRYPTION_TKIP_AES, "secret99")),
+        HasSubstr("ApCliAuthMode=WPA2PSK\nApCliEncrypType=AES\n"));
+    EXPECT_THAT(text(Network(WIFI_SECURITY_DISABLED, WIFI_ENCRYPTION_ERROR, "")),
+                HasSubstr("ApCliAuthMode=OPEN\nApCliEncrypType=NONE\n"));
+    for (const StationInfo& bad :
+         {Network(WIFI_SECURITY_ENTERPRISE_WPA2, WIFI_ENCRYPTION_AES, "secret99"),
+          Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "short"),
+          Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "secret;99"),
+          Network(WIFI_SECURITY_WEP, WIFI_ENCRYPTION_ERROR, "0a1b2c3d4z")}) {
+        EXPECT_EQ(text(bad), "refused") << bad.password;
+    }
+    StationInfo lines = Network(WIFI_SECURITY_DISABLED, WIFI_ENCRYPTION_ERROR, "");
+    lines.essid = "home\nApCliEnable=0";
+    EXPECT_EQ(text(lines), "refused");
+
+    AdapterAgentClientRLT agent("wlan0");
+    AdapterConfig config;
+    config.client_enabled = true;
+    config.stations = {Network(WIFI_SECURITY_PERSONAL_WPA2, WIFI_ENCRYPTION_AES, "secret99")};
+    ASSERT_EQ(agent.GetClientConfig(config), 0);
+    root_.Scenario("iwpriv", "when wlan0 connStatus\nprint wlan0     connStatus:Disconnected\n");
+    EXPECT_EQ(agent.DoConnecting(), -1);
+    EXPECT_EQ(CallsStartingWith("/sbin/iwpriv wlan0 connStatus"), 15);
+    EXPECT_TRUE(log_.Contains("Time out to connect AP [wlan0]"));
+    EXPECT_EQ(CallsStartingWith("/sbin/iwpriv wlan0 set ApCliEnable=0"), 1);
+
+    root_.Scenario("iwpriv",
+                   "when wlan0 connStatus\nprint wlan0     connStatus:Connected(AP: home)\n");
+    root_.ClearCalls();
+    EXPECT_EQ(agent.DoConnecting(), 0);
+    const auto calls = root_.Calls();
+    ASSERT_GE(calls.size(), 4u);
+    EXPECT_EQ(calls[0], "/sbin/rmmod rlt_wifi");
+    EXPECT_THAT(calls[1], HasSubstr("/usr/vorn/lib/modules/rlt_wifi.ko"));
+    EXPECT_EQ(calls[2], "/sbin/ifconfig wlan0 up");
+    EXPECT_EQ(calls[3], "/sbin/iwpriv wlan0 connStatus");
+    EXPECT_THAT(root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi_sta.conf"),
+                HasSubstr("ApCliSsid=home\n"));
+    EXPECT_EQ(agent.GetStatus(config), WIFI_STATUS_ENABLED);
+    config.stations[0].opmode = WIFI_OPMODE_AD_HOC;
+    EXPECT_EQ(agent.AdHocEnable(config), -1);
+
+    root_.ClearCalls();
+    EXPECT_EQ(agent.DoDisconnect(), 0);
+    EXPECT_THAT(root_.Calls(),
+                ElementsAre("/sbin/iwpriv wlan0 set ApCliEnable=0",
+                            "/sbin/stop dhcp-client IFACE=wlan0", "/sbin/ifconfig wlan0 down"));
 }
 
 }  // namespace
