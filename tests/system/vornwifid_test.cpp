@@ -3,6 +3,7 @@
 #include <gio/gio.h>
 #include <gmock/gmock.h>
 #include <signal.h>
+#include <algorithm>
 
 #include <filesystem>
 #include <fstream>
@@ -292,6 +293,34 @@ TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
     std::string out;
     EXPECT_EQ(RunProgram({kVornwifid, "--help"}, kExitTimeout, &out), 0);
     EXPECT_THAT(out, AllOf(HasSubstr("Usage: vornwifid"), HasSubstr("--foreground")));
+    ExpectServing();
+}
+
+TEST_F(VornwifidTest, KiteBBuiltInRadioComesUpThroughItsDriverProfile) {
+    root_.WriteFile("/etc.defaults/vorninfo.conf",
+                    "model=\"kite-b\"\nbuiltin_wlan_mac=\"02:76:6f:72:6e:02\"\n");
+    ASSERT_NO_FATAL_FAILURE(Start());
+    Json::Value config = Parsed(Call("GetAdapterConfig", "wlan0"));
+    config["enabled"] = true;
+    config["ssid"] = "Kite";
+    config["mode"] = "bgn";
+    root_.ClearCalls();
+    const Answer applied = Call("ApplyAdapter", "wlan0", Compact(config));
+    EXPECT_TRUE(applied.ok) << applied.text << wifid_->Stderr();
+    const std::string profile = root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi.conf");
+    EXPECT_THAT(profile, AllOf(HasSubstr("\nSSID1=Kite\n"), HasSubstr("\nWirelessMode=9\n")));
+    const auto calls = root_.Calls();
+    for (const char* call : {"/sbin/rmmod rlt_wifi", "/sbin/ifconfig wlan0 up",
+                             "/sbin/iwpriv wlan0 set WscConfMode=7"}) {
+        EXPECT_NE(std::find(calls.begin(), calls.end(), call), calls.end())
+            << call << wifid_->Stderr();
+    }
+    EXPECT_EQ(Parsed(Call("GetAdapterStatus", "wlan0"))["status"], "Enabled");
+
+    // The driver splits its values at ";": refused, and the profile stays.
+    config["ssid"] = "Kite;2";
+    EXPECT_FALSE(Call("ApplyAdapter", "wlan0", Compact(config)).ok);
+    EXPECT_EQ(root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi.conf"), profile);
     ExpectServing();
 }
 

@@ -144,23 +144,7 @@ std::string WpaPsk(WIFI_SECURITY security, WIFI_ENCRYPTION encryption,
 bool IsWritable(const AdapterConfig& config) {
     AdapterConfig accessPoint = config;
     accessPoint.stations.clear();  // the station client's networks reach no profile
-    if (CheckAdapterConfig(accessPoint) != 0) {
-        return false;
-    }
-    const std::pair<const char*, const std::string*> texts[] = {
-        {"ssid", &config.ssid},
-        {"password", &config.password},
-        {"guest_ssid", &config.guest_ssid},
-        {"guest_password", &config.guest_password},
-        {"CountryCode", &config.CountryCode},
-        {"auth_server_shared_secret", &config.auth_server_shared_secret}};
-    for (const auto& text : texts) {
-        if (text.second->find(';') != std::string::npos) {
-            VORN_LOG(LOG_ERR, "Refused config: %s holds \";\"", text.first);
-            return false;
-        }
-    }
-    return true;
+    return CheckAdapterConfig(accessPoint) == 0 && CheckRLTConfig(accessPoint) == 0;
 }
 
 std::string GuestInterface(const std::string& ifname) {

@@ -259,11 +259,32 @@ int BridgeBase::RunBrctl(const char* verb, const std::string& bridge, const std:
     return QLIBCExecl(kBrctl, kExecFlags, verb, bridge.c_str(), slave.c_str(), nullptr);
 }
 
+// The bridge listing it; else a guest interface "gwlanN" belongs to "gbrN", any other to the
+// topology's own bridge.
+BridgeBase* BridgeBase::BridgeToHold(const std::string& ifname) {
+    if (BridgeBase* listed = FindBridgeFromSlave(ifname)) {
+        return listed;
+    }
+    if (IsGuestWirelessIf(ifname)) {
+        return GetBridge("gbr" + ifname.substr(std::string("gwlan").size()));
+    }
+    for (const auto& bridge : GetList()) {
+        if (!IsGuestBridge(bridge->name_)) {
+            return bridge.get();
+        }
+    }
+    return nullptr;
+}
+
 int BridgeBase::AddSlave(const std::string& ifname) {
-    BridgeBase* bridge = FindBridgeFromSlave(ifname);
+    BridgeBase* bridge = BridgeToHold(ifname);
     if (bridge == nullptr || QLIBCFileExist(("/sys/class/net/" + ifname).c_str()) != 1) {
         VORN_LOG(LOG_ERR, "Failed to enum [%s] under [%s]", ifname.c_str(), "/sys/class/net");
         return -1;
+    }
+    auto& slaves = bridge->config_.slaveList;
+    if (std::find(slaves.begin(), slaves.end(), ifname) == slaves.end()) {
+        slaves.push_back(ifname);
     }
     const std::string& name = bridge->name_;
     if (QLIBCFileExist(("/sys/class/net/" + name + "/brif/" + ifname).c_str()) == 1) {

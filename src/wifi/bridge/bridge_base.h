@@ -40,7 +40,8 @@ class BridgeBase {
     static int DisableAll();
 
     // Kernel membership of the listed slaves that exist under "/sys/class/net" ("brctl addif",
-    // "brctl delif"); a bridge missing in the kernel is made first ("brctl addbr").
+    // "brctl delif"); a bridge missing in the kernel is made first ("brctl addbr"). AddSlave
+    // also lists the interface in the bridge that should hold it, RemoveSlaveWlan(IF) unlists it.
     static int AddSlave(const std::string& ifname);
     static int RemoveSlaveWlan(const std::string& ifname);
     static int AddSlaveEth();
@@ -130,6 +131,7 @@ class BridgeBase {
     BridgeConfig config_;
 
   private:
+    static BridgeBase* BridgeToHold(const std::string& ifname);
     // Disable, then enable, when flag is set; each failure logged through its format ("%s": the
     // bridge name, or none).
     int Reload(bool flag, int (BridgeBase::*disable)(), int (BridgeBase::*enable)(),

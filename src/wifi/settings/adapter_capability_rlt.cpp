@@ -1,6 +1,7 @@
 #include "wifi/settings/adapter_capability_rlt.h"
 
 #include "wifi/settings/adapter_capability_kite_model.h"
+#include "wifi/settings/adapter_config_check.h"
 
 namespace vornwireless {
 namespace wifi {
@@ -39,6 +40,13 @@ std::vector<int> AdapterCapabilityRLT::GetChannel() const {
         channels.push_back((frequency - base) / kMhzPerChannel);
     }
     return channels;
+}
+
+int AdapterCapabilityRLT::Verify(const AdapterConfig& config) const {
+    if (AdapterCapability::Verify(config) < 0) {
+        return -1;
+    }
+    return CheckRLTConfig(config);
 }
 
 }  // namespace wifi

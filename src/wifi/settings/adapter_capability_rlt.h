@@ -11,6 +11,8 @@ namespace wifi {
 class AdapterCapabilityRLT : public AdapterCapability {
   public:
     using AdapterCapability::AdapterCapability;
+    // The general checks, and CheckRLTConfig: the driver's files cannot carry ";".
+    int Verify(const AdapterConfig& config) const override;
     std::vector<WIFI_FEATURE> GetFeature() const override;
     std::vector<WIFI_MODE> GetMode() const override;
     std::vector<WIFI_BANDWIDTH> GetBandwidth() const override;

@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <set>
 #include <string>
+#include <utility>
+#include <vector>
 
 #include "utils/interface_name.h"
 #include "utils/log.h"
@@ -102,6 +104,27 @@ int CheckAdapterConfig(const AdapterConfig& config) {
                       "is repeated");
     }
     return check.Ok() ? 0 : -1;
+}
+
+int CheckRLTConfig(const AdapterConfig& config) {
+    std::vector<std::pair<const char*, const std::string*>> texts = {
+        {"ssid", &config.ssid},
+        {"password", &config.password},
+        {"guest_ssid", &config.guest_ssid},
+        {"guest_password", &config.guest_password},
+        {"CountryCode", &config.CountryCode},
+        {"auth_server_shared_secret", &config.auth_server_shared_secret}};
+    for (const auto& station : config.stations) {
+        texts.emplace_back("stationList.essid", &station.essid);
+        texts.emplace_back("stationList.password", &station.password);
+    }
+    for (const auto& text : texts) {
+        if (text.second->find(';') != std::string::npos) {
+            VORN_LOG(LOG_ERR, "Refused config: %s holds \";\"", text.first);
+            return -1;
+        }
+    }
+    return 0;
 }
 
 }  // namespace wifi

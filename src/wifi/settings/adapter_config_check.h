@@ -15,6 +15,10 @@ namespace wifi {
 int CheckAdapterConfig(const AdapterConfig& config);
 // The same checks for one station client network.
 int CheckStationInfo(const AdapterConfig::StationInfo& station);
+// What the RLT radio's driver files add: it splits every value at ";", so no SSID, password,
+// country code or RADIUS secret (of either network or any station) may hold one. 0, or -1
+// logged with the field.
+int CheckRLTConfig(const AdapterConfig& config);
 
 }  // namespace wifi
 }  // namespace vornwireless
