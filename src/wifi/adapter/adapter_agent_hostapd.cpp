@@ -82,9 +82,7 @@ bool IsWepKeyWritable(WIFI_SECURITY security, const std::string& key) {
 
 // Every text reaches a file that hostapd reads line by line, up to the line end.
 bool IsWritable(const AdapterConfig& config) {
-    AdapterConfig accessPoint = config;
-    accessPoint.stations.clear();  // the station client's networks reach no hostapd file
-    if (CheckAdapterConfig(accessPoint) != 0) {
+    if (CheckAccessPointConfig(config) != 0) {
         return false;
     }
     if (!IsWepKeyWritable(config.security, config.password) ||

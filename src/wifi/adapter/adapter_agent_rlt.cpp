@@ -142,9 +142,7 @@ std::string WpaPsk(WIFI_SECURITY security, WIFI_ENCRYPTION encryption,
 
 // The driver splits every value at ";", and reads the file line by line.
 bool IsWritable(const AdapterConfig& config) {
-    AdapterConfig accessPoint = config;
-    accessPoint.stations.clear();  // the station client's networks reach no profile
-    return CheckAdapterConfig(accessPoint) == 0 && CheckRLTConfig(accessPoint) == 0;
+    return CheckAccessPointConfig(config) == 0 && CheckRLTConfig(config) == 0;
 }
 
 std::string GuestInterface(const std::string& ifname) {

@@ -106,6 +106,12 @@ int CheckAdapterConfig(const AdapterConfig& config) {
     return check.Ok() ? 0 : -1;
 }
 
+int CheckAccessPointConfig(const AdapterConfig& config) {
+    AdapterConfig accessPoint = config;
+    accessPoint.stations.clear();
+    return CheckAdapterConfig(accessPoint);
+}
+
 int CheckRLTConfig(const AdapterConfig& config) {
     std::vector<std::pair<const char*, const std::string*>> texts = {
         {"ssid", &config.ssid},

@@ -13,6 +13,8 @@ namespace wifi {
 // printable characters or 64 hex digits, checked where it is used (the main network when
 // enabled, the guest network when enabled, every station). 0 or -1.
 int CheckAdapterConfig(const AdapterConfig& config);
+// The same checks without the station client's networks, which reach no access-point file.
+int CheckAccessPointConfig(const AdapterConfig& config);
 // The same checks for one station client network.
 int CheckStationInfo(const AdapterConfig::StationInfo& station);
 // What the RLT radio's driver files add: it splits every value at ";", so no SSID, password,
