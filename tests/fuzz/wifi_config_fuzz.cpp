@@ -11,6 +11,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <map>
 #include <set>
 #include <sstream>
@@ -36,6 +37,11 @@ void Require(bool condition) {
     if (!condition) {
         std::abort();
     }
+}
+
+std::set<std::string> Words(const std::string& text) {
+    std::istringstream in(text);
+    return {std::istream_iterator<std::string>(in), std::istream_iterator<std::string>()};
 }
 
 std::vector<std::string> Lines(const std::string& text) {
@@ -76,44 +82,13 @@ void CheckHostapd(const AdapterConfig& config) {
     if (agent.GenerateHostapdConfig(config) != 0) {
         return;
     }
-    const std::set<std::string> keys = {"interface",
-                                        "driver",
-                                        "ssid",
-                                        "ignore_broadcast_ssid",
-                                        "macaddr_acl",
-                                        "wpa_psk_file",
-                                        "wps_state",
-                                        "ap_setup_locked",
-                                        "ctrl_interface",
-                                        "config_methods",
-                                        "max_num_sta",
-                                        "bridge",
-                                        "channel",
-                                        "wmm_enabled",
-                                        "hw_mode",
-                                        "ieee80211n",
-                                        "ht_capab",
-                                        "require_ht",
-                                        "eap_server",
-                                        "auth_algs",
-                                        "wep_default_key",
-                                        "wep_key0",
-                                        "wpa",
-                                        "wpa_key_mgmt",
-                                        "wpa_psk",
-                                        "wpa_passphrase",
-                                        "wpa_pairwise",
-                                        "rsn_pairwise",
-                                        "ieee8021x",
-                                        "auth_server_addr",
-                                        "auth_server_port",
-                                        "auth_server_shared_secret",
-                                        "deny_mac_file",
-                                        "accept_mac_file",
-                                        "bss",
-                                        "bssid",
-                                        "ap_isolate",
-                                        "enable"};
+    const std::set<std::string> keys = Words(
+        "interface driver ssid ignore_broadcast_ssid macaddr_acl wpa_psk_file wps_state "
+        "ap_setup_locked ctrl_interface config_methods max_num_sta bridge channel wmm_enabled "
+        "hw_mode ieee80211n ht_capab require_ht eap_server auth_algs wep_default_key wep_key0 wpa "
+        "wpa_key_mgmt wpa_psk wpa_passphrase wpa_pairwise rsn_pairwise ieee8021x "
+        "auth_server_addr auth_server_port auth_server_shared_secret deny_mac_file "
+        "accept_mac_file bss bssid ap_isolate enable");
     for (const char* file : {"-host.conf", "-guest.conf", ".info", "-guest.info"}) {
         KeyValues(Lines(ReadFile(std::string("/etc/hostapd/hostapd-wlan0") + file)), keys,
                   {"macaddr_acl"});
@@ -131,18 +106,12 @@ void CheckRLT(const AdapterConfig& config) {
     Require(lines.front() == "Default");
     lines.erase(lines.begin());
     // One value per network: at most "main;guest;".
-    const std::set<std::string> lists = {"HideSSID", "AuthMode", "EncrypType", "DefaultKeyID",
-                                         "Key1",     "WPAPSK",   "IEEE8021X",  "NoForwarding"};
-    std::set<std::string> keys = {"CountryRegion", "CountryRegionABand",
-                                  "CountryCode",   "BssidNum",
-                                  "SSID1",         "SSID2",
-                                  "WirelessMode",  "Channel",
-                                  "MaxStaNum",     "WmmCapable",
-                                  "HT_BW",         "VHT_BW",
-                                  "TxPower",       "RADIUS_Server",
-                                  "RADIUS_Port",   "RADIUS_Key",
-                                  "own_ip_addr",   "EAPifname",
-                                  "PreAuthifname"};
+    const std::set<std::string> lists =
+        Words("HideSSID AuthMode EncrypType DefaultKeyID Key1 WPAPSK IEEE8021X NoForwarding");
+    std::set<std::string> keys = Words(
+        "CountryRegion CountryRegionABand CountryCode BssidNum SSID1 SSID2 WirelessMode Channel "
+        "MaxStaNum WmmCapable HT_BW VHT_BW TxPower RADIUS_Server RADIUS_Port RADIUS_Key "
+        "own_ip_addr EAPifname PreAuthifname");
     keys.insert(lists.begin(), lists.end());
     for (const auto& pair : KeyValues(lines, keys)) {
         const auto separators = std::count(pair.second.begin(), pair.second.end(), ';');
@@ -166,9 +135,9 @@ void CheckStations(const AdapterConfig& config) {
             Require(lines.front() == "Default");
             lines.erase(lines.begin());
             for (const auto& pair :
-                 KeyValues(lines, {"ApCliEnable", "ApCliSsid", "ApCliBssid", "ApCliAuthMode",
-                                   "ApCliEncrypType", "ApCliDefaultKeyID", "ApCliKey1Type",
-                                   "ApCliKey1Str", "ApCliWPAPSK"})) {
+                 KeyValues(lines, Words("ApCliEnable ApCliSsid ApCliBssid ApCliAuthMode "
+                                        "ApCliEncrypType ApCliDefaultKeyID ApCliKey1Type "
+                                        "ApCliKey1Str ApCliWPAPSK"))) {
                 Require(pair.second.find(';') == std::string::npos);
             }
         }
