@@ -19,6 +19,7 @@
 #include "utils/log.h"
 #include "utils/process.h"
 #include "wifi/adapter/adapter.h"
+#include "wifi/settings/adapter_config_check.h"
 #include "wifi/settings/enum_map.h"
 #include "wifi/utils/station_utils.h"
 #include "wifi/utils/utils.h"
@@ -41,17 +42,11 @@ constexpr int kQuietFlags = kExecFlags | QLIBC_EXEC_NO_STDERR;
 constexpr int kAssociationPolls = 15;
 constexpr int kTerminateAttempts = 3;
 constexpr int kDownAttempts = 3;
-constexpr std::size_t kMaxSsidBytes = 32;
 constexpr std::size_t kStateBytes = 128;
 // A few hundred networks in range at most; a line of the listing is well under 128 bytes.
 
 bool IsPrintableAscii(unsigned char c) {
     return c >= 0x20 && c < 0x7f;
-}
-
-bool IsHex(const std::string& text) {
-    return std::all_of(text.begin(), text.end(),
-                       [](char c) { return std::isxdigit(static_cast<unsigned char>(c)) != 0; });
 }
 
 // What the supplicant reads between double quotes up to the last one, byte for byte.
@@ -115,7 +110,7 @@ bool AddPairwise(const StationInfo& station, const char* kind, std::string& text
 bool AddWepKey(const std::string& key, std::string& text) {
     if ((key.size() == 5 || key.size() == 13) && IsQuotable(key)) {
         text += "\twep_key0=" + Quoted(key) + "\n";
-    } else if ((key.size() == 10 || key.size() == 26) && IsHex(key)) {
+    } else if ((key.size() == 10 || key.size() == 26) && IsHexText(key)) {
         text += "\twep_key0=" + key + "\n";
     } else {
         VORN_LOG(LOG_ERR, "Wrong WEP Format.");
@@ -127,7 +122,7 @@ bool AddWepKey(const std::string& key, std::string& text) {
 
 // A passphrase of 8 to 63 characters, or the key itself as 64 hex digits.
 bool AddPsk(const std::string& password, std::string& text) {
-    if (password.size() == 64 && IsHex(password)) {
+    if (password.size() == 64 && IsHexText(password)) {
         text += "\tpsk=" + password + "\n";
     } else if (password.size() >= 8 && password.size() <= 63 && IsQuotable(password)) {
         text += "\tpsk=" + Quoted(password) + "\n";

@@ -25,6 +25,7 @@
 #include "utils/interface_name.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
+#include "wifi/settings/adapter_config_check.h"
 #include "wifi/settings/enum_map.h"
 
 namespace vornwireless {
@@ -126,13 +127,9 @@ constexpr std::size_t kMaxScanLines = 512;
 constexpr std::size_t kScanLineBytes = 256;
 constexpr int kMaxChannel = 200;
 constexpr int kMaxSignal = 100;
-constexpr std::size_t kMaxSsidBytes = 32;
 
 bool FromHex(const std::string& hex, std::string& bytes) {
-    const bool digits = std::all_of(hex.begin(), hex.end(), [](char c) {
-        return std::isxdigit(static_cast<unsigned char>(c)) != 0;
-    });
-    if (hex.size() % 2 != 0 || !digits) {
+    if (hex.size() % 2 != 0 || !IsHexText(hex)) {
         return false;
     }
     bytes.clear();

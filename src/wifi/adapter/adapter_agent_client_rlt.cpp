@@ -1,7 +1,5 @@
 #include "wifi/adapter/adapter_agent_client_rlt.h"
 
-#include <algorithm>
-#include <cctype>
 
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
@@ -9,6 +7,7 @@
 #include "platform/text_file.h"
 #include "utils/file.h"
 #include "utils/log.h"
+#include "wifi/settings/adapter_config_check.h"
 #include "wifi/utils/utils.h"
 
 namespace vornwireless {
@@ -23,7 +22,6 @@ constexpr const char* kIfconfig = "/sbin/ifconfig";
 constexpr const char* kIwpriv = "/sbin/iwpriv";
 constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO_STDOUT;
 constexpr int kJoinPolls = 15;
-constexpr std::size_t kMaxSsidBytes = 32;
 constexpr std::size_t kStatusBytes = 128;
 
 bool Refuse(const char* what) {
@@ -36,16 +34,11 @@ bool IsValue(const std::string& text) {
     return text.find_first_of(std::string(";\r\n\0", 4)) == std::string::npos;
 }
 
-bool IsHex(const std::string& text) {
-    return std::all_of(text.begin(), text.end(),
-                       [](char c) { return std::isxdigit(static_cast<unsigned char>(c)) != 0; });
-}
-
 // Key1Type 1 is a key of 5 or 13 characters, 0 one of 10 or 26 hex digits.
 bool AddWepLines(const std::string& key, std::string& text) {
     if (key.size() == 5 || key.size() == 13) {
         text += "ApCliKey1Type=1\nApCliKey1Str=" + key + "\n";
-    } else if ((key.size() == 10 || key.size() == 26) && IsHex(key)) {
+    } else if ((key.size() == 10 || key.size() == 26) && IsHexText(key)) {
         text += "ApCliKey1Type=0\nApCliKey1Str=" + key + "\n";
     } else {
         return Refuse("WEP key");
@@ -54,8 +47,7 @@ bool AddWepLines(const std::string& key, std::string& text) {
 }
 
 bool AddPskLine(const std::string& password, std::string& text) {
-    const bool passphrase = password.size() >= 8 && password.size() <= 63;
-    if (!passphrase && !(password.size() == 64 && IsHex(password))) {
+    if (!IsPassphrase(password)) {
         return Refuse("password");
     }
     text += "ApCliWPAPSK=" + password + "\n";

@@ -56,11 +56,6 @@ class ConfText {
     std::string text_;
 };
 
-bool IsHex(const std::string& text) {
-    return std::all_of(text.begin(), text.end(),
-                       [](char c) { return std::isxdigit(static_cast<unsigned char>(c)) != 0; });
-}
-
 bool IsPersonal(WIFI_SECURITY security) {
     return security == WIFI_SECURITY_PERSONAL_WPA || security == WIFI_SECURITY_PERSONAL_WPA2 ||
            security == WIFI_SECURITY_PERSONAL_WPA_MIXED;
@@ -77,7 +72,7 @@ bool IsHexWepKey(const std::string& key) {
 
 // hostapd takes a hex WEP key as it stands: anything but hex digits fails the whole file.
 bool IsWepKeyWritable(WIFI_SECURITY security, const std::string& key) {
-    return security != WIFI_SECURITY_WEP || !IsHexWepKey(key) || IsHex(key);
+    return security != WIFI_SECURITY_WEP || !IsHexWepKey(key) || IsHexText(key);
 }
 
 // Every text reaches a file that hostapd reads line by line, up to the line end.
@@ -202,7 +197,7 @@ void AddWepKey(const std::string& key, ConfText& conf) {
 // hostapd takes a passphrase of 8 to 63 characters; 64 hex digits are the key itself.
 void AddPersonalLines(WIFI_SECURITY security, WIFI_ENCRYPTION encryption,
                       const std::string& password, ConfText& conf) {
-    const bool psk = password.size() == kHexPskLength && IsHex(password);
+    const bool psk = password.size() == kHexPskLength && IsHexText(password);
     conf("auth_algs", 1)("wpa", WpaVersion(security))("wpa_key_mgmt", "WPA-PSK");
     conf(psk ? "wpa_psk" : "wpa_passphrase", password);
     AddCipherLines(encryption, conf);

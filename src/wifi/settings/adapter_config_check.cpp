@@ -13,7 +13,6 @@ namespace vornwireless {
 namespace wifi {
 namespace {
 
-constexpr std::size_t kMaxSsidLength = 32;
 constexpr std::size_t kMinPassphrase = 8;
 constexpr std::size_t kMaxPassphrase = 63;
 constexpr std::size_t kHexKeyLength = 64;
@@ -27,15 +26,6 @@ bool IsPersonalWpa(WIFI_SECURITY security) {
            security == WIFI_SECURITY_PERSONAL_WPA_MIXED;
 }
 
-bool IsPassphrase(const std::string& text) {
-    if (text.size() == kHexKeyLength) {
-        return std::all_of(text.begin(), text.end(),
-                           [](char c) { return std::isxdigit(static_cast<unsigned char>(c)); });
-    }
-    return text.size() >= kMinPassphrase && text.size() <= kMaxPassphrase &&
-           std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; });
-}
-
 // Collects the first refusal; later checks only run while none has been found.
 class Checker {
   public:
@@ -44,7 +34,7 @@ class Checker {
     }
     void Ssid(const char* field, const std::string& text) {
         Text(field, text);
-        Require(text.size() <= kMaxSsidLength, field, "is longer than 32 bytes");
+        Require(text.size() <= kMaxSsidBytes, field, "is longer than 32 bytes");
     }
     void Mac(const char* field, const vornwireless::utils::MacAddress& mac) {
         Require(mac.IsFormalized(), field, "is not a MAC address");
@@ -73,6 +63,19 @@ void CheckStation(Checker& check, const AdapterConfig::StationInfo& station) {
 }
 
 }  // namespace
+
+bool IsHexText(const std::string& text) {
+    return std::all_of(text.begin(), text.end(),
+                       [](char c) { return std::isxdigit(static_cast<unsigned char>(c)) != 0; });
+}
+
+bool IsPassphrase(const std::string& text) {
+    if (text.size() == kHexKeyLength) {
+        return IsHexText(text);
+    }
+    return text.size() >= kMinPassphrase && text.size() <= kMaxPassphrase &&
+           std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c <= '~'; });
+}
 
 int CheckStationInfo(const AdapterConfig::StationInfo& station) {
     Checker check;

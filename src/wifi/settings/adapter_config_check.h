@@ -1,10 +1,21 @@
 #ifndef VORN_WIFI_SETTINGS_ADAPTER_CONFIG_CHECK_H
 #define VORN_WIFI_SETTINGS_ADAPTER_CONFIG_CHECK_H
 
+#include <cstddef>
+#include <string>
+
 #include "wifi/settings/adapter_config.h"
 
 namespace vornwireless {
 namespace wifi {
+
+// The longest SSID 802.11 allows, in bytes.
+constexpr std::size_t kMaxSsidBytes = 32;
+
+// Hex digits only (the empty text too).
+bool IsHexText(const std::string& text);
+// A WPA passphrase: 8 to 63 printable ASCII characters, or the key itself as 64 hex digits.
+bool IsPassphrase(const std::string& text);
 
 // Whether a configuration from outside may reach the generated files (section files, hostapd,
 // wpa_supplicant). Refused, with a log line naming the field: a text holding a line break, a
