@@ -1,6 +1,5 @@
 #include "wifi/adapter/adapter_agent_client_rlt.h"
 
-
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "platform/shell_command.h"
