@@ -39,6 +39,13 @@ bool IsEnterprise(WIFI_SECURITY security) {
     return security == WIFI_SECURITY_ENTERPRISE_WPA || security == WIFI_SECURITY_ENTERPRISE_WPA2;
 }
 
+// What the authentication lines read of one network.
+struct Network {
+    WIFI_SECURITY security;
+    WIFI_ENCRYPTION encryption;
+    const std::string& password;
+};
+
 // One value per network: the main one alone, or "main;guest;" with the guest network.
 std::string PerNetwork(bool guest, const std::string& main, const std::string& guestValue) {
     return guest ? main + ";" + guestValue + ";" : main;
@@ -94,7 +101,6 @@ std::string AuthMode(WIFI_SECURITY security) {
     }
 }
 
-// logged: the encryption a "Bad encryption" line names, the main network's for both.
 std::string EncrypType(WIFI_SECURITY security, WIFI_ENCRYPTION encryption, WIFI_ENCRYPTION logged) {
     if (security == WIFI_SECURITY_DISABLED) {
         return "NONE";
@@ -173,31 +179,23 @@ int AdapterAgentRLT::SetAuth(const AdapterConfig& config, std::ostream& out) {
         VORN_LOG(LOG_ERR, "conf not opened");
         return -1;
     }
-    const bool guest = config.guest_enabled;
-    out << "AuthMode="
-        << PerNetwork(guest, AuthMode(config.security),
-                      guest ? AuthMode(config.guest_security) : "")
-        << "\n";
-    out << "EncrypType="
-        << PerNetwork(
-               guest, EncrypType(config.security, config.encryption, config.encryption),
-               guest ? EncrypType(config.guest_security, config.guest_encryption, config.encryption)
-                     : "")
-        << "\n";
-    out << "DefaultKeyID="
-        << PerNetwork(guest, DefaultKeyId(config.security),
-                      guest ? DefaultKeyId(config.guest_security) : "")
-        << "\n";
-    out << "Key1="
-        << PerNetwork(guest, Key1(config.security, config.password),
-                      Key1(config.guest_security, config.guest_password))
-        << "\n";
-    out << "WPAPSK="
-        << PerNetwork(
-               guest, WpaPsk(config.security, config.encryption, config.password),
-               guest ? WpaPsk(config.guest_security, config.guest_encryption, config.guest_password)
-                     : "")
-        << "\n";
+    const Network main{config.security, config.encryption, config.password};
+    const Network guest{config.guest_security, config.guest_encryption, config.guest_password};
+    // The guest network's value is made, and its errors logged, only while it is on.
+    const auto line = [&](const char* key, auto value) {
+        out << key
+            << PerNetwork(config.guest_enabled, value(main),
+                          config.guest_enabled ? value(guest) : "")
+            << "\n";
+    };
+    line("AuthMode=", [](const Network& n) { return AuthMode(n.security); });
+    // A "Bad encryption" line names the main network's encryption for both.
+    line("EncrypType=", [&config](const Network& n) {
+        return EncrypType(n.security, n.encryption, config.encryption);
+    });
+    line("DefaultKeyID=", [](const Network& n) { return DefaultKeyId(n.security); });
+    line("Key1=", [](const Network& n) { return Key1(n.security, n.password); });
+    line("WPAPSK=", [](const Network& n) { return WpaPsk(n.security, n.encryption, n.password); });
     SetAuthDetail(config, out);
     return 0;
 }
