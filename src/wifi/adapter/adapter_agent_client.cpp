@@ -6,8 +6,8 @@
 #include <cctype>
 #include <cerrno>
 #include <csignal>
-#include <cstdio>
 #include <cstring>
+#include <map>
 #include <sstream>
 
 #include "platform/qlibc_file.h"
@@ -42,7 +42,6 @@ constexpr int kQuietFlags = kExecFlags | QLIBC_EXEC_NO_STDERR;
 constexpr int kAssociationPolls = 15;
 constexpr int kTerminateAttempts = 3;
 constexpr int kDownAttempts = 3;
-constexpr std::size_t kStateBytes = 128;
 // A few hundred networks in range at most; a line of the listing is well under 128 bytes.
 
 bool IsPrintableAscii(unsigned char c) {
@@ -216,15 +215,8 @@ int AdapterAgentClient::SetWpaSupplicantConfig() const {
 }
 
 std::string AdapterAgentClient::WpaState() const {
-    const std::string command =
-        std::string(kWpaCli) + " -i " + GetName() + " status | grep wpa_state";
-    std::string line;
-    char state[kStateBytes] = {};
-    if (!IsNameValid() || vorn::platform::ReadShellCommandLine(command, line, kStateBytes) != 0 ||
-        std::sscanf(line.c_str(), " wpa_state=%127s", state) != 1) {
-        return "";
-    }
-    return state;
+    std::map<std::string, std::string> status;
+    return utils::ReadSupplicantStatus(GetName(), status) ? status["wpa_state"] : "";
 }
 
 bool AdapterAgentClient::WaitForAssociation() const {

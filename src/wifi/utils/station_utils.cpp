@@ -23,7 +23,8 @@ constexpr int kMaxInterfaces = 128;
 constexpr std::size_t kMaxStatusLines = 64;
 constexpr std::size_t kStatusLineBytes = 512;
 
-// "key=value" lines of "wpa_cli -i IF status".
+}  // namespace
+
 bool ReadSupplicantStatus(const std::string& ifname, std::map<std::string, std::string>& status) {
     if (!vornwireless::utils::CheckInterfaceName(ifname)) {
         return false;
@@ -43,8 +44,6 @@ bool ReadSupplicantStatus(const std::string& ifname, std::map<std::string, std::
     }
     return true;
 }
-
-}  // namespace
 
 int GetAdapterNum() {
     QLIBSZLIST* list = nullptr;

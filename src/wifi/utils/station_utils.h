@@ -3,6 +3,8 @@
 
 #include <json/json.h>
 
+#include <map>
+#include <string>
 #include <vector>
 
 #include "wifi/settings/adapter_config.h"
@@ -16,6 +18,10 @@ namespace utils {
 // The wireless interfaces present ("wlan" entries of "/sys/class/net"); 0 when none or the
 // directory cannot be listed.
 int GetAdapterNum();
+
+// The "key=value" lines of "wpa_cli -i IF status" into status; false (logged) for a bad name
+// or a command that cannot run.
+bool ReadSupplicantStatus(const std::string& ifname, std::map<std::string, std::string>& status);
 
 // A known or scanned network in the JSON form of a configuration's "stations" entries, with the
 // scan's "signal".
