@@ -11,40 +11,32 @@
 namespace vornwireless::hook {
 namespace {
 
-class BaseHookTest : public vorn::test::RootTest {
-  protected:
-    // A script at the hook point that appends the named variables, one line per run.
-    void Recorder(const std::string& point, const std::string& variables) {
-        const std::string path = "/etc/vorn/plugins/net/" + point + ".d/10-record";
-        root_.WriteFile(
-            path, "#!/bin/sh\necho \"" + variables + "\" >> " + root_.Path("/tmp/" + point) + "\n");
-        chmod(root_.Path(path).c_str(), 0755);
-    }
-    std::string Recorded(const std::string& point) const { return root_.ReadFile("/tmp/" + point); }
-};
+using BaseHookTest = vorn::test::RootTest;
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
 
 TEST_F(BaseHookTest, HooksPassTheirArgumentsToTheScripts) {
-    Recorder("gateway_change", "$ACTION $IFNAME $DESTINATION $GATEWAY $PLUGIN_ACTION");
-    Recorder("topology_change", "$OLD_TOPOLOGY>$NEW_TOPOLOGY");
-    Recorder("arp_ignore_change", "$NEW_VALUE");
-    Recorder("bond_change", "$ACTION");
+    root_.RecordHook("gateway_change", "$ACTION $IFNAME $DESTINATION $GATEWAY $PLUGIN_ACTION");
+    root_.RecordHook("topology_change", "$OLD_TOPOLOGY>$NEW_TOPOLOGY");
+    root_.RecordHook("arp_ignore_change", "$NEW_VALUE");
+    root_.RecordHook("bond_change", "$ACTION");
 
     EXPECT_TRUE(GatewayChangeHook("NEW", "eth0", "", "10.0.0.1").ExecHook(5));
     EXPECT_TRUE(GatewayChangeHook("DEL", "eth0", "10.1.0.0", "").ExecHook(5));
-    EXPECT_EQ(Recorded("gateway_change"),
-              "NEW eth0 0.0.0.0 10.0.0.1 5\nDEL eth0 10.1.0.0 0.0.0.0 5\n");
+    EXPECT_THAT(root_.HookRuns("gateway_change"),
+                ElementsAre("NEW eth0 0.0.0.0 10.0.0.1 5", "DEL eth0 10.1.0.0 0.0.0.0 5"));
     EXPECT_TRUE(TopologyChangeHook("router", "bridge").ExecHook(QLIB_PLUGIN_ACTION_BEFORE));
     EXPECT_TRUE(ArpIgnoreChangeHook(true).ExecHook(5));
     EXPECT_TRUE(BondChangeHook("add").ExecHook(5));
-    EXPECT_EQ(Recorded("topology_change"), "router>bridge\n");
-    EXPECT_EQ(Recorded("arp_ignore_change"), "true\n");
-    EXPECT_EQ(Recorded("bond_change"), "add\n");
+    EXPECT_THAT(root_.HookRuns("topology_change"), ElementsAre("router>bridge"));
+    EXPECT_THAT(root_.HookRuns("arp_ignore_change"), ElementsAre("true"));
+    EXPECT_THAT(root_.HookRuns("bond_change"), ElementsAre("add"));
     EXPECT_TRUE(log_.Lines().empty());
 }
 
 TEST_F(BaseHookTest, InvalidOrBrokenHooksFailWithOneLogLineAndRunNothing) {
-    Recorder("gateway_change", "$ACTION");
-    Recorder("ipv4_change", "$NEW_ADDRESS");
+    root_.RecordHook("gateway_change", "$ACTION");
+    root_.RecordHook("ipv4_change", "$NEW_ADDRESS");
     EXPECT_FALSE(GatewayChangeHook("", "eth0", "", "").ExecHook(5));
     EXPECT_FALSE(TopologyChangeHook("router", "").ExecHook(4));
     EXPECT_EQ(log_.Matching("Hook environment is not valid").size(), 2u);
@@ -65,8 +57,8 @@ TEST_F(BaseHookTest, InvalidOrBrokenHooksFailWithOneLogLineAndRunNothing) {
     EXPECT_FALSE(NetIPChangeEvent(IPTYPE_IPV6, "eth0", "", "2001:db8::3", 129));
     EXPECT_FALSE(NetIPChangeEvent(static_cast<IPTYPE>(2), "eth0", "none", "10.0.0.5", 24));
     EXPECT_EQ(QLIBCErrGet(), QLIBC_ERR_INVALID_ARG);
-    EXPECT_EQ(Recorded("gateway_change"), "");
-    EXPECT_EQ(Recorded("ipv4_change"), "");
+    EXPECT_THAT(root_.HookRuns("gateway_change"), IsEmpty());
+    EXPECT_THAT(root_.HookRuns("ipv4_change"), IsEmpty());
 
     // A failing script fails the hook.
     const std::string failing = "/etc/vorn/plugins/net/ipv4_change.d/20-fail";

@@ -1,7 +1,6 @@
 #include "platform/qlibc_file.h"
 
 #include <gtest/gtest.h>
-#include <sys/stat.h>
 
 #include <cstring>
 #include <memory>
@@ -131,40 +130,6 @@ TEST_F(QlibcFileTest, SectionsWriteAndReadBack) {
               0);
     EXPECT_EQ(root_.ReadFile("/etc/r.conf"), "[conf]\n\tk=v\n[addr]\na=1\n[lan]\n\tp=q\n");
     EXPECT_EQ(QLIBCFileAddSection("/etc/new/r.conf", "conf", pairs.get(), "\t%s=%s\n"), -1);
-}
-
-TEST_F(QlibcFileTest, FileOperationsStayUnderTheRoot) {
-    root_.WriteFile("/tmp/src", "content\n");
-    chmod(root_.Path("/tmp/src").c_str(), 0600);
-    ASSERT_EQ(VORNFileCopy("/tmp/src", "/tmp/dst"), 0);
-    EXPECT_EQ(VORNFileCopy("/tmp/none", "/tmp/dst"), -1);
-    ASSERT_EQ(QLIBCSysRename("/tmp/dst", "/tmp/moved"), 0);
-    EXPECT_EQ(root_.ReadFile("/tmp/moved"), "content\n");
-    struct stat info;
-    ASSERT_EQ(stat(root_.Path("/tmp/moved").c_str(), &info), 0);
-    EXPECT_EQ(info.st_mode & 0777, 0600u);
-    ASSERT_EQ(QLIBCSysUnlink("/tmp/moved"), 0);
-    EXPECT_FALSE(root_.Exists("/tmp/moved"));
-    EXPECT_EQ(QLIBCSysUnlink("/tmp/moved"), -1);
-}
-
-TEST_F(QlibcFileTest, EnumDirListsMatchingNamesSortedUpToTheBound) {
-    for (const char* name :
-         {"vornwireless.wlan1", "vornwireless.pid", "vornwireless.ath0", "other"}) {
-        root_.WriteFile(std::string("/tmp/") + name, "");
-    }
-    QLIBSZLIST* names = nullptr;
-    ASSERT_EQ(QLIBCFileEnumDir("/tmp", "vornwireless", 2, &names), 2);
-    EXPECT_STREQ(QLIBCSzListGet(names, 0), "vornwireless.ath0");
-    EXPECT_STREQ(QLIBCSzListGet(names, 1), "vornwireless.pid");
-    QLIBCSzListFree(names);
-    names = nullptr;
-    EXPECT_EQ(QLIBCFileEnumDir("/tmp", "none", 8, &names), 0);
-    QLIBCSzListFree(names);
-    names = nullptr;
-    EXPECT_EQ(QLIBCFileEnumDir("/missing", "", 8, &names), -1);
-    EXPECT_EQ(log_.Lines().size(), 2u);  // the cut and the unreadable directory
-    QLIBCSzListFree(names);
 }
 
 }  // namespace

@@ -23,15 +23,6 @@ using ::testing::HasSubstr;
 
 extern "C" char** environ;
 
-// Ended and reaped, or a zombie no one has reaped yet: either way no longer running.
-bool IsGone(const std::string& pid) {
-    std::ifstream stat("/proc/" + pid + "/stat");
-    std::string line;
-    std::getline(stat, line);
-    const std::size_t close = line.rfind(')');
-    return line.empty() || (close != std::string::npos && line.compare(close, 3, ") Z") == 0);
-}
-
 pid_t Spawn(const std::string& program, const char* arg) {
     char* const argv[] = {const_cast<char*>(program.c_str()), const_cast<char*>(arg), nullptr};
     pid_t pid = -1;
@@ -82,7 +73,7 @@ TEST_F(QlibcProcTest, AProgramPastTheDeadlineIsKilledWithAllItStarted) {
     std::string grandchild;
     std::ifstream(pidFile) >> grandchild;
     ASSERT_FALSE(grandchild.empty());
-    EXPECT_TRUE(vorn::test::WaitFor([&] { return IsGone(grandchild); }));
+    EXPECT_TRUE(vorn::test::WaitFor([&] { return vorn::test::HasEnded(std::stol(grandchild)); }));
     EXPECT_THAT(log_.Lines(), Contains(HasSubstr("Killed [/bin/sh -c sleep 30 &")));
     EXPECT_THAT(log_.Lines(), Contains(HasSubstr("Killed [echo early; /bin/sleep 30]")));
     QLIBCExecSetTimeout(0);

@@ -1,6 +1,6 @@
 #include "utils/sdk_s.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 #include <pthread.h>
 
 #include <thread>
@@ -9,6 +9,8 @@
 
 namespace vornwireless::sdk_s {
 namespace {
+
+using ::testing::HasSubstr;
 
 using SdkSTest = vorn::test::RootTest;
 
@@ -20,10 +22,9 @@ TEST_F(SdkSTest, PassesResultsThroughAndCallsFromTwoThreadsDoNotOverlap) {
     other.join();
     const auto lines = log_.Matching(" func (QLIBCExec) ");
     ASSERT_EQ(lines.size(), 6u);
-    EXPECT_NE(
-        lines[0].find("thread (" + std::to_string(static_cast<unsigned long>(pthread_self())) +
-                      ") func (QLIBCExec) start"),
-        std::string::npos);
+    EXPECT_THAT(lines[0],
+                HasSubstr("thread (" + std::to_string(static_cast<unsigned long>(pthread_self())) +
+                          ") func (QLIBCExec) start"));
     for (size_t i = 0; i < lines.size(); ++i) {
         EXPECT_NE(lines[i].find(i % 2 == 0 ? ") start" : ") end"), std::string::npos) << lines[i];
     }

@@ -9,6 +9,7 @@
 
 #include "platform/qlibc_container.h"
 #include "platform/text_file.h"
+#include "require.h"
 
 namespace {
 
@@ -21,12 +22,6 @@ Pairs ToPairs(const QLIBSZHASH* hash) {
         pairs.emplace_back(QLIBCSzHashKeyAt(hash, i), QLIBCSzHashValueAt(hash, i));
     }
     return pairs;
-}
-
-void Require(bool condition) {
-    if (!condition) {
-        std::abort();
-    }
 }
 
 std::string Write(const Pairs& pairs, const char* format) {

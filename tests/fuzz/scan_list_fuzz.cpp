@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "require.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter_agent_client_base.h"
 #include "wifi/utils/adapter_config_json.h"
@@ -19,12 +20,6 @@ namespace {
 
 using vornwireless::wifi::AdapterAgentClientBase;
 using StationInfo = vornwireless::wifi::AdapterConfig::StationInfo;
-
-void Require(bool condition) {
-    if (!condition) {
-        std::abort();
-    }
-}
 
 bool HasLineByte(const std::string& text) {
     return text.find_first_of(std::string("\r\n\0", 3)) != std::string::npos;

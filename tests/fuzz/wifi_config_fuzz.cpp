@@ -19,6 +19,7 @@
 #include <vector>
 
 #include "platform/root_path.h"
+#include "require.h"
 #include "utils/json_text.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
@@ -32,12 +33,6 @@
 namespace {
 
 using namespace vornwireless::wifi;
-
-void Require(bool condition) {
-    if (!condition) {
-        std::abort();
-    }
-}
 
 std::set<std::string> Words(const std::string& text) {
     std::istringstream in(text);
@@ -123,12 +118,16 @@ void CheckStations(const AdapterConfig& config) {
     for (const auto& station : config.stations) {
         std::string text;
         if (AdapterAgentClient::WpaSupplicantConfigText(station, text) == 0) {
-            const std::vector<std::string> lines = Lines(text);
+            std::vector<std::string> lines = Lines(text);
             Require(lines.size() >= 4 && lines[1] == "network={" && lines.back() == "}");
-            for (std::size_t i = 2; i + 1 < lines.size(); ++i) {
-                Require(lines[i].size() > 1 && lines[i][0] == '\t' &&
-                        lines[i].find('=') != std::string::npos && lines[i][1] != '}');
+            KeyValues({lines.front()}, {"ctrl_interface"});
+            std::vector<std::string> block(lines.begin() + 2, lines.end() - 1);
+            for (std::string& line : block) {
+                Require(line.size() > 1 && line[0] == '\t');
+                line.erase(0, 1);
             }
+            KeyValues(block, Words("ssid bssid scan_ssid mode key_mgmt wep_key0 auth_alg pairwise "
+                                   "psk wep_tx_keyidx eap identity password"));
         }
         if (AdapterAgentClientRLT::StationConfigText(station, text) == 0) {
             std::vector<std::string> lines = Lines(text);

@@ -9,6 +9,7 @@
 #include "platform/root_path.h"
 #include "support/private_bus.h"
 #include "support/waiting.h"
+#include "utils/json_text.h"
 
 namespace vorn {
 namespace test {
@@ -89,17 +90,37 @@ void SimRoot::Scenario(const std::string& program, const std::string& text) cons
 }
 
 std::vector<std::string> SimRoot::Calls() const {
-    std::istringstream log(ReadFile(kCallLog));
-    std::vector<std::string> calls;
-    for (std::string line; std::getline(log, line);) {
-        calls.push_back(line);
-    }
-    return calls;
+    return Lines(ReadFile(kCallLog));
 }
 
 void SimRoot::ClearCalls() const {
     std::error_code ignored;
     fs::remove(Path(kCallLog), ignored);
+}
+
+void SimRoot::RecordHook(const std::string& point, const std::string& line) const {
+    const std::string script = "/etc/vorn/plugins/net/" + point + ".d/10-record";
+    WriteFile(script, "#!/bin/sh\necho \"" + line + "\" >>" + Path("/tmp/" + point) + "\n");
+    fs::permissions(Path(script), fs::perms::owner_all);
+}
+
+std::vector<std::string> SimRoot::HookRuns(const std::string& point) const {
+    return Lines(ReadFile("/tmp/" + point));
+}
+
+std::vector<std::string> Lines(const std::string& text) {
+    std::istringstream in(text);
+    std::vector<std::string> lines;
+    for (std::string line; std::getline(in, line);) {
+        lines.push_back(line);
+    }
+    return lines;
+}
+
+Json::Value Parse(const std::string& text) {
+    Json::Value value;
+    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
+    return value;
 }
 
 }  // namespace test

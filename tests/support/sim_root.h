@@ -2,6 +2,7 @@
 #define VORN_TEST_SIM_ROOT_H
 
 #include <gtest/gtest.h>
+#include <json/json.h>
 
 #include <string>
 #include <vector>
@@ -40,11 +41,21 @@ class SimRoot {
     std::vector<std::string> Calls() const;
     void ClearCalls() const;
 
+    // A script at a hook point (e.g. "ipv4_change") that, at each run, appends one line: the
+    // given text with the hook's variables expanded. HookRuns gives those lines in order.
+    void RecordHook(const std::string& point, const std::string& line) const;
+    std::vector<std::string> HookRuns(const std::string& point) const;
+
   private:
     SavedVariable savedRoot_{"VORN_ROOT"};
     SavedVariable savedPath_{"PATH"};
     std::string dir_;
 };
+
+// The lines of a text, without their line breaks.
+std::vector<std::string> Lines(const std::string& text);
+// A JSON text parsed; one that does not parse fails the test.
+Json::Value Parse(const std::string& text);
 
 // Base fixture of unit tests: a fresh simulated root and captured log lines for every test.
 class RootTest : public ::testing::Test {

@@ -5,6 +5,7 @@
 
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <thread>
 #include <utility>
 #include <vector>
@@ -23,6 +24,13 @@ bool WaitFor(const std::function<bool()>& done, std::chrono::milliseconds limit)
         std::this_thread::sleep_for(std::chrono::milliseconds(20));
     }
     return true;
+}
+
+char ProcessState(long pid) {
+    std::string stat;
+    std::getline(std::ifstream("/proc/" + std::to_string(pid) + "/stat"), stat);
+    const std::string::size_type close = stat.rfind(") ");
+    return close == std::string::npos || close + 2 >= stat.size() ? '\0' : stat[close + 2];
 }
 
 std::string Shell(const std::string& command) {

@@ -30,6 +30,15 @@ class SavedVariable {
     std::optional<std::string> value_;
 };
 
+// The state letter of a process in /proc ('R', 'S', 'T' when stopped, 'Z' when a zombie, …);
+// '\0' once it is gone.
+char ProcessState(long pid);
+// Gone, or a zombie no one has reaped yet: either way no longer running.
+inline bool HasEnded(long pid) {
+    const char state = ProcessState(pid);
+    return state == '\0' || state == 'Z';
+}
+
 // A new folder under TMPDIR (or /tmp) named prefix and a random tail; "" when none can be made.
 std::string MakeTempDir(const std::string& prefix);
 

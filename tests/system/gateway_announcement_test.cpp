@@ -9,8 +9,8 @@
 #include "dbus/net_server.h"
 #include "network/module/module_manager.h"
 #include "support/private_bus.h"
+#include "support/sim_root.h"
 #include "utils/dbus_client.h"
-#include "utils/json_text.h"
 
 namespace {
 
@@ -47,11 +47,7 @@ class RecordingRouteModule : public BaseModule {
 };
 RecordingRouteModule* RecordingRouteModule::instance = nullptr;
 
-Json::Value Parse(const std::string& text) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
-    return value;
-}
+using vorn::test::Parse;
 
 TEST(GatewayAnnouncementTest, TheRouteModuleGetsExactlyTheAnnouncedKeys) {
     vorn::test::PrivateBus bus;

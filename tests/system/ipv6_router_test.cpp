@@ -32,13 +32,6 @@ constexpr char kDhcpdConf[] =
     "default-lease-time 600;\nmax-lease-time 7200;\n"
     "subnet6 2001:db8:ffff::/64 { prefix6 2001:db8:0:100:: 2001:db8:0:100:: /56; }\n";
 
-// A process that has ended, zombies included.
-bool HasEnded(int pid) {
-    std::string stat;
-    std::getline(std::ifstream("/proc/" + std::to_string(pid) + "/stat"), stat);
-    return stat.empty() || stat.find(") Z") != std::string::npos;
-}
-
 class Router6SystemTest : public PeerNamespaceTest {
   protected:
     void SetUp() override {

@@ -1,11 +1,9 @@
 #include "network/module/netlink_module.h"
 
 #include <gmock/gmock.h>
-#include <sys/stat.h>
 
 #include <algorithm>
 #include <fstream>
-#include <sstream>
 
 #include "network/utils.h"
 #include "platform/shell_command.h"
@@ -31,9 +29,9 @@ class NetlinkModuleSystemTest : public ::testing::Test {
         VORN_ENTER_PRIVATE_NETWORK_NAMESPACE_OR_SKIP();
         root_ = std::make_unique<SimRoot>(SimRoot::Kind::kLive);
         for (const char* point : {"ipv4_change", "ipv6_change"}) {
-            Record(point, "$IFNAME|$ORIGIN_ADDRESS|$NEW_ADDRESS|$PREFIX_LENGTH");
+            root_->RecordHook(point, "$IFNAME|$ORIGIN_ADDRESS|$NEW_ADDRESS|$PREFIX_LENGTH");
         }
-        Record("gateway_change", "$ACTION|$IFNAME|$DESTINATION|$GATEWAY");
+        root_->RecordHook("gateway_change", "$ACTION|$IFNAME|$DESTINATION|$GATEWAY");
         // No link-local addresses: the IPv6 lists hold only what the tests add.
         std::ofstream(root_->Path("/proc/sys/net/ipv6/conf/default/addr_gen_mode")) << "1\n";
         Ip("link add v0 index 11 type veth peer name v1 index 12");
@@ -72,21 +70,14 @@ class NetlinkModuleSystemTest : public ::testing::Test {
     std::string Operstate(const std::string& name) const {
         return root_->ReadFile("/sys/class/net/" + name + "/operstate");
     }
-    void Record(const std::string& point, const std::string& variables) const {
-        const std::string script = "/etc/vorn/plugins/net/" + point + ".d/record";
-        root_->WriteFile(script, "#!/bin/sh\necho \"" + variables + "\" >>" +
-                                     root_->Path("/tmp/" + point) + "\n");
-        chmod(root_->Path(script).c_str(), 0755);
-    }
     // The hook's runs whose line contains part.
     std::vector<std::string> Runs(const std::string& point, const std::string& part) const {
-        std::istringstream text(root_->ReadFile("/tmp/" + point));
-        std::vector<std::string> lines;
-        for (std::string line; std::getline(text, line);) {
-            if (line.find(part) != std::string::npos) {
-                lines.push_back(line);
-            }
-        }
+        std::vector<std::string> lines = root_->HookRuns(point);
+        lines.erase(std::remove_if(lines.begin(), lines.end(),
+                                   [&](const std::string& line) {
+                                       return line.find(part) == std::string::npos;
+                                   }),
+                    lines.end());
         return lines;
     }
     // The platform link handler calls naming the interface.

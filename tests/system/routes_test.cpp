@@ -7,7 +7,6 @@
 #include "network/route/static_route.h"
 #include "support/peer_namespace.h"
 #include "support/waiting.h"
-#include "utils/json_text.h"
 
 namespace vornnetwork {
 namespace network {
@@ -17,11 +16,7 @@ using ::testing::HasSubstr;
 using ::testing::Not;
 using vorn::test::Shell;
 
-Json::Value Parse(const std::string& text) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
-    return value;
-}
+using vorn::test::Parse;
 
 class RouteSystemTest : public vorn::test::PeerNamespaceTest {
   protected:

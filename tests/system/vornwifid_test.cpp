@@ -6,7 +6,6 @@
 #include <algorithm>
 
 #include <filesystem>
-#include <fstream>
 #include <map>
 #include <memory>
 #include <string>
@@ -24,13 +23,14 @@ namespace test {
 namespace {
 
 using ::testing::AllOf;
+using ::testing::ElementsAre;
 using ::testing::HasSubstr;
+using vornwireless::utils::CompactJson;
 using Timeout = DaemonProcess::Timeout;
 
 constexpr char kVornwifid[] = VORN_BINARY_DIR "/daemons/vornwifid";
 constexpr char kVornnetd[] = VORN_BINARY_DIR "/daemons/vornnetd";
 constexpr char kService[] = "com.tessarin.wifi";
-constexpr char kHookDir[] = "/etc/vorn/plugins/net/topology_change.d";
 constexpr Timeout kStartTimeout{60000};
 constexpr Timeout kCallTimeout{30000};
 constexpr Timeout kExitTimeout{20000};
@@ -55,10 +55,6 @@ Json::Value Parsed(const Answer& answer) {
     Json::Value value;
     EXPECT_TRUE(vornwireless::utils::ParseJson(answer.text, value, 1 << 24)) << answer.text;
     return value;
-}
-
-std::string Compact(const Json::Value& value) {
-    return vornwireless::utils::CompactJson(value);
 }
 
 // Every regular file of the root with its content, the simulator's own records left out.
@@ -106,11 +102,7 @@ class VornwifidTest : public ::testing::Test {
 };
 
 TEST_F(VornwifidTest, ServesEveryMethodThroughTheBusAndTheClient) {
-    root_.WriteFile(std::string(kHookDir) + "/record",
-                    "#!/bin/sh\necho \"$PLUGIN_ACTION $OLD_TOPOLOGY $NEW_TOPOLOGY\" >> "
-                    "\"$VORN_ROOT/tmp/hooks\"\n");
-    std::filesystem::permissions(root_.Path(std::string(kHookDir) + "/record"),
-                                 std::filesystem::perms::owner_all);
+    root_.RecordHook("topology_change", "$PLUGIN_ACTION $OLD_TOPOLOGY $NEW_TOPOLOGY");
     ASSERT_NO_FATAL_FAILURE(Start());
     vornwireless::dbus::WifiClient client;
     EXPECT_TRUE(client.IsServerReady());
@@ -118,7 +110,7 @@ TEST_F(VornwifidTest, ServesEveryMethodThroughTheBusAndTheClient) {
     // What the daemon found at start: the router topology's bridge and the radio.
     Json::Value value;
     ASSERT_EQ(client.GetAdapterList(value), 0);
-    EXPECT_EQ(Compact(value), R"(["wlan0"])");
+    EXPECT_EQ(CompactJson(value), R"(["wlan0"])");
     Json::Value config;
     ASSERT_EQ(client.GetAdapterConfig("wlan0", config), 0);
     EXPECT_EQ(config["name"].asString(), "wlan0");
@@ -158,7 +150,7 @@ TEST_F(VornwifidTest, ServesEveryMethodThroughTheBusAndTheClient) {
     EXPECT_EQ(client.SwitchWifiOnOff(), 0);
     // An access point scans for nothing.
     ASSERT_EQ(client.ScanNetworks("wlan0", value), 0);
-    EXPECT_EQ(Compact(value), "[]");
+    EXPECT_EQ(CompactJson(value), "[]");
     // Nor is it joined to one.
     EXPECT_EQ(Call("GetConnectedAPInfo", "wlan0").text,
               "Failed to load connected AP info for interface(wlan0)");
@@ -168,18 +160,20 @@ TEST_F(VornwifidTest, ServesEveryMethodThroughTheBusAndTheClient) {
     const std::string lbr0Ipv6 = "/proc/sys/net/ipv6/conf/lbr0/disable_ipv6";
     std::filesystem::remove_all(root_.Path("/proc/sys/net/ipv6/conf/lbr0"));
     EXPECT_EQ(Call("SwitchTopology", "bridge").text, "Failed to switch topology(bridge)");
-    EXPECT_EQ(root_.ReadFile("/tmp/hooks"), "4 router bridge\n5 router bridge\n");
+    EXPECT_THAT(root_.HookRuns("topology_change"),
+                ElementsAre("4 router bridge", "5 router bridge"));
     root_.WriteFile(lbr0Ipv6, "0\n");
-    std::filesystem::remove(root_.Path("/tmp/hooks"));
     EXPECT_EQ(client.SwitchTopology("bridge"), 0) << wifid_->Stderr();
-    EXPECT_EQ(root_.ReadFile("/tmp/hooks"), "4 router bridge\n5 router bridge\n");
+    EXPECT_THAT(
+        root_.HookRuns("topology_change"),
+        ElementsAre("4 router bridge", "5 router bridge", "4 router bridge", "5 router bridge"));
     ASSERT_EQ(client.GetBridgeList(value), 0);
     EXPECT_EQ(value[0]["ifname"].asString(), "br0") << value;
 
     // The adapter list emptied, refilled from sysfs (the one 10 s loop is never reached here).
     EXPECT_EQ(client.ForceRemoveAllAdapters(), 0);
     ASSERT_EQ(client.GetAdapterList(value), 0);
-    EXPECT_EQ(Compact(value), "[]");
+    EXPECT_EQ(CompactJson(value), "[]");
     EXPECT_EQ(client.RefreshAdapterList(), 0);
     EXPECT_EQ(client.RemoveAdapter("wlan0"), 0);
     EXPECT_EQ(client.AddAdapter("wlan0"), 0);
@@ -239,13 +233,13 @@ TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
     Json::Value badBridge = bridge;
     badBridge["dhcp_enabled"] = "yes";
     badBridge["slave_list"] = Json::Value(7);
-    const std::vector<std::string> adapterInputs = {"not json", deep, "[]", Compact(wrongTypes),
-                                                    Compact(newline)};
+    const std::vector<std::string> adapterInputs = {"not json", deep, "[]", CompactJson(wrongTypes),
+                                                    CompactJson(newline)};
     for (const std::string& input : adapterInputs) {
         EXPECT_EQ(Call("ApplyAdapter", "wlan0", input).text, "Failed to get config(wlan0)")
             << input.substr(0, 60);
     }
-    for (const std::string& input : {std::string("not json"), deep, Compact(badBridge)}) {
+    for (const std::string& input : {std::string("not json"), deep, CompactJson(badBridge)}) {
         EXPECT_EQ(Call("ApplyBridge", "lbr0", input).text, "Failed to get config(lbr0)")
             << input.substr(0, 60);
     }
@@ -280,10 +274,7 @@ TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
     root_.WriteFile("/var/run/evmond.pid", std::to_string(evmond.Pid()) + "\n");
     ASSERT_NO_FATAL_FAILURE(Start());
     EXPECT_FALSE(root_.Exists("/tmp/topology.lock"));
-    std::ifstream stat("/proc/" + std::to_string(evmond.Pid()) + "/stat");
-    std::string pid, name, state;
-    stat >> pid >> name >> state;
-    EXPECT_NE(state, "T");
+    EXPECT_NE(ProcessState(evmond.Pid()), 'T');
     EXPECT_FALSE(Parsed(Call("GetAdapterConfig", "wlan0"))["enabled"].asBool());
 
     DaemonProcess second({kVornwifid, "--foreground"});
@@ -305,7 +296,7 @@ TEST_F(VornwifidTest, KiteBBuiltInRadioComesUpThroughItsDriverProfile) {
     config["ssid"] = "Kite";
     config["mode"] = "bgn";
     root_.ClearCalls();
-    const Answer applied = Call("ApplyAdapter", "wlan0", Compact(config));
+    const Answer applied = Call("ApplyAdapter", "wlan0", CompactJson(config));
     EXPECT_TRUE(applied.ok) << applied.text << wifid_->Stderr();
     const std::string profile = root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi.conf");
     EXPECT_THAT(profile, AllOf(HasSubstr("\nSSID1=Kite\n"), HasSubstr("\nWirelessMode=9\n")));
@@ -319,7 +310,7 @@ TEST_F(VornwifidTest, KiteBBuiltInRadioComesUpThroughItsDriverProfile) {
 
     // The driver splits its values at ";": refused, and the profile stays.
     config["ssid"] = "Kite;2";
-    EXPECT_FALSE(Call("ApplyAdapter", "wlan0", Compact(config)).ok);
+    EXPECT_FALSE(Call("ApplyAdapter", "wlan0", CompactJson(config)).ok);
     EXPECT_EQ(root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi.conf"), profile);
     ExpectServing();
 }

@@ -1,11 +1,8 @@
 // Every form of supplicant file the station agent writes goes through the real wpa_supplicant's
-// parser, and every line carries a key the agent writes (that parser would not notice an
-// injected line). A neighbour's essid written in hex reads back as the same bytes.
+// parser (the configuration fuzz target checks each line's key, which that parser would not). A
+// neighbour's essid written in hex reads back as the same bytes.
 #include <gmock/gmock.h>
 #include <unistd.h>
-
-#include <set>
-#include <sstream>
 
 #include "support/private_bus.h"
 #include "support/sim_root.h"
@@ -22,10 +19,6 @@ using StationInfo = AdapterConfig::StationInfo;
 constexpr const char* kSupplicant = "/usr/sbin/wpa_supplicant";
 constexpr const char* kParseFailure = "Failed to read or parse configuration";
 
-const std::set<std::string> kKeys = {"ctrl_interface", "ssid",     "bssid",    "scan_ssid", "mode",
-                                     "key_mgmt",       "wep_key0", "auth_alg", "pairwise",  "psk",
-                                     "wep_tx_keyidx",  "eap",      "identity", "password"};
-
 StationInfo Network(WIFI_SECURITY security, WIFI_ENCRYPTION encryption,
                     const std::string& password) {
     StationInfo station;
@@ -37,20 +30,6 @@ StationInfo Network(WIFI_SECURITY security, WIFI_ENCRYPTION encryption,
     station.user = "ann@example.org";
     station.password = password;
     return station;
-}
-
-// Lines whose key the agent does not write, other than the block's own braces.
-std::string UnknownKeys(const std::string& text) {
-    std::istringstream lines(text);
-    std::string line, unknown;
-    while (std::getline(lines, line)) {
-        const std::string key = line.substr(line.find_first_not_of('\t'),
-                                            line.find('=') - line.find_first_not_of('\t'));
-        if (line != "network={" && line != "}" && kKeys.count(key) == 0) {
-            unknown += line + "\n";
-        }
-    }
-    return unknown;
 }
 
 class WpaSupplicantConfigSystemTest : public vorn::test::RootTest {
@@ -82,7 +61,6 @@ class WpaSupplicantConfigSystemTest : public vorn::test::RootTest {
         const std::string said = Parse(text);
         EXPECT_THAT(said, HasSubstr("Reading configuration file")) << text;
         EXPECT_THAT(said, Not(HasSubstr(kParseFailure))) << text << said;
-        EXPECT_EQ(UnknownKeys(text), "") << text;
         return said;
     }
 };

@@ -10,7 +10,6 @@
 #include "support/private_bus.h"
 #include "support/sim_root.h"
 #include "utils/dbus_client.h"
-#include "utils/json_text.h"
 
 namespace vorn::network::ipv6::router {
 namespace {
@@ -20,11 +19,7 @@ using ::testing::IsEmpty;
 
 constexpr char kSettings[] = "/etc/sysconfig/networking/ipv6-";
 
-Json::Value Parse(const std::string& text) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
-    return value;
-}
+using vorn::test::Parse;
 
 class Router6Test : public test::RootTest {
   protected:

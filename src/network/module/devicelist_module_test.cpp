@@ -8,7 +8,6 @@
 #include <vector>
 
 #include "support/sim_root.h"
-#include "utils/json_text.h"
 
 namespace vornnetwork::network::module {
 namespace {
@@ -18,11 +17,7 @@ using ::testing::ElementsAre;
 constexpr char kDir[] = "/var/packages/Linkyard/target/data/";
 constexpr char kFile[] = "/var/packages/Linkyard/target/data//connectionlist_upnpscanner.json";
 
-Json::Value Parse(const std::string& text) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
-    return value;
-}
+using vorn::test::Parse;
 
 // The scanners' lists are the test's own; each asked scanner is recorded.
 class ListedModule : public DeviceListModule {

@@ -5,7 +5,6 @@
 #include <net/if.h>
 
 #include <cstdint>
-#include <cstring>
 #include <string>
 #include <vector>
 
@@ -13,7 +12,6 @@
 #include "network/module/route_module.h"
 #include "platform/vorn_net.h"
 #include "support/sim_root.h"
-#include "utils/json_text.h"
 
 namespace vornnetwork::network::module {
 namespace {
@@ -49,11 +47,7 @@ Bytes Advert(std::uint8_t flags, const std::vector<Bytes>& options) {
     return packet;
 }
 
-Json::Value Parse(const char* text) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
-    return value;
-}
+using vorn::test::Parse;
 
 class IPv6ModuleTest : public vorn::test::RootTest {
   protected:
@@ -181,31 +175,6 @@ TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixAndFlagsAndMalformedOnesAreDropped
     EXPECT_EQ(log_.Matching("zero length option in RA").size(), 1u);
     EXPECT_EQ(log_.Matching("prefix option too short in RA").size(), 1u);
     EXPECT_EQ(log_.Matching("Invalid router advertisement from").size(), 2u);
-}
-
-TEST_F(IPv6ModuleTest, PacketInformationIsChecked) {
-    alignas(cmsghdr) unsigned char control[CMSG_SPACE(sizeof(in6_pktinfo))] = {};
-    msghdr message{};
-    message.msg_control = control;
-    message.msg_controllen = sizeof(control);
-    cmsghdr* header = CMSG_FIRSTHDR(&message);
-    header->cmsg_level = IPPROTO_IPV6;
-    header->cmsg_type = IPV6_PKTINFO;
-    header->cmsg_len = CMSG_LEN(sizeof(in6_pktinfo));
-    in6_pktinfo info{};
-    info.ipi6_ifindex = 11;
-    std::memcpy(CMSG_DATA(header), &info, sizeof(info));
-    ASSERT_NE(IPv6Module::FindPacketInfo(message), nullptr);
-    EXPECT_EQ(IPv6Module::FindPacketInfo(message)->ipi6_ifindex, 11u);
-    info.ipi6_ifindex = 0;
-    std::memcpy(CMSG_DATA(header), &info, sizeof(info));
-    EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
-    header->cmsg_len = CMSG_LEN(sizeof(int));
-    EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
-    message.msg_controllen = 0;
-    EXPECT_EQ(IPv6Module::FindPacketInfo(message), nullptr);
-    EXPECT_EQ(log_.Matching("received a bogus IPV6_PKTINFO from the kernel! len=").size(), 2u);
-    EXPECT_TRUE(log_.Contains("received no IPV6_PKTINFO from the kernel"));
 }
 
 TEST_F(IPv6ModuleTest, ListeningThreadEndsWithTheModule) {

@@ -35,10 +35,8 @@ class RouteModuleTest : public vorn::test::RootTest {
   protected:
     // Sends a request written as JSON text; its answer.
     Json::Value Send(const std::string& text) {
-        Json::Value request;
-        EXPECT_TRUE(vornwireless::utils::ParseJson(text, request)) << text;
         Json::Value answer;
-        EXPECT_EQ(module_.ProcessRequest(request, answer), 0) << text;
+        EXPECT_EQ(module_.ProcessRequest(vorn::test::Parse(text), answer), 0) << text;
         return answer;
     }
     void Add(const char* type, const std::string& ifname, int priority,
@@ -198,10 +196,9 @@ TEST_F(RouteModuleTest, OnlyHarmfulRequestsAreRefusedAndTheySayWhy) {
         {R"("ADD_GATEWAY_DATA")", "Invalid request"},
     };
     for (const auto& request : refused) {
-        Json::Value parsed;
         Json::Value answer;
-        ASSERT_TRUE(vornwireless::utils::ParseJson(request.first, parsed));
-        EXPECT_EQ(module_.ProcessRequest(parsed, answer), -1) << request.first;
+        EXPECT_EQ(module_.ProcessRequest(vorn::test::Parse(request.first), answer), -1)
+            << request.first;
         EXPECT_EQ(answer["error"].asString(), request.second) << request.first;
         EXPECT_EQ(Files(), files) << request.first;
     }
@@ -239,11 +236,12 @@ TEST_F(RouteModuleTest, OnlyHarmfulRequestsAreRefusedAndTheySayWhy) {
     root_.WriteFile(kV4File, full);
     ASSERT_EQ(module_.ReadGatewayListFromFile(GTYPE_V4), 0);
     Json::Value answer;
-    Json::Value request;
-    ASSERT_TRUE(vornwireless::utils::ParseJson(
-        R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth9","priority":0})",
-        request));
-    EXPECT_EQ(module_.ProcessRequest(request, answer), -1);
+    EXPECT_EQ(
+        module_.ProcessRequest(
+            vorn::test::Parse(
+                R"({"method":"ADD_GATEWAY_DATA","type":"GTYPE_V4","ifname":"eth9","priority":0})"),
+            answer),
+        -1);
     EXPECT_EQ(answer["error"].asString(), "Too many gateways");
     Add("GTYPE_V4", "e7", 0);
     EXPECT_EQ(module_.GetList(GTYPE_V4).size(), 1024u);

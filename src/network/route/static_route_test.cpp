@@ -16,11 +16,7 @@ using ::testing::IsEmpty;
 const char kRuleFile[] = "/etc/iproute2/config/static-table-rule";
 const char kRuleFileV6[] = "/etc/iproute2/config/static-table-rule-v6";
 
-Json::Value Parse(const std::string& text) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
-    return value;
-}
+using vorn::test::Parse;
 
 using StaticRouteTest = vorn::test::RootTest;
 

@@ -5,7 +5,6 @@
 #include <unistd.h>
 
 #include <csignal>
-#include <fstream>
 
 #include "support/sim_root.h"
 #include "wifi/adapter/adapter_agent_ap.h"
@@ -218,12 +217,7 @@ TEST_F(AdapterTest, TopologySwitchRunsInOrderAndAlwaysResumesTheEventDaemon) {
         _exit(0);
     }
     root_.WriteFile("/var/run/evmond.pid", std::to_string(daemon) + "\n");
-    const auto running = [daemon] {
-        std::ifstream stat("/proc/" + std::to_string(daemon) + "/stat");
-        std::string pid, comm, state;
-        stat >> pid >> comm >> state;
-        return state != "T";
-    };
+    const auto running = [daemon] { return vorn::test::ProcessState(daemon) != 'T'; };
     ASSERT_EQ(utils::WriteTopology(WIFI_TOPOLOGY_CLIENT), 0);
     Adapter::SwitchTopology(WIFI_TOPOLOGY_CLIENT);
     root_.ClearCalls();

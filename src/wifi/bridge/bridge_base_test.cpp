@@ -13,6 +13,8 @@ namespace vornwireless {
 namespace wifi {
 namespace {
 
+using ::testing::HasSubstr;
+
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
@@ -106,9 +108,8 @@ TEST_F(BridgeTest, ApplyReloadsWhatChangedAndWritesDhcpFiles) {
               "dhcp-option=tag:lbr0v60,option6:dns-server,[2001:db8::1],[2001:db8::53]\n"
               "enable-ra\n");
     EXPECT_EQ(root_.ReadFile("/etc/dhcpd/dhcpd-lbr0-lbr0v60.info"), "enable=\"no\"\n");
-    EXPECT_NE(
-        root_.ReadFile("/usr/vorn/etc/wifi/wifi_topology_router_cv").find("dhcpv6_type=stateful"),
-        std::string::npos);
+    EXPECT_THAT(root_.ReadFile("/usr/vorn/etc/wifi/wifi_topology_router_cv"),
+                HasSubstr("dhcpv6_type=stateful"));
 
     // Refused configurations change nothing and run nothing.
     root_.ClearCalls();

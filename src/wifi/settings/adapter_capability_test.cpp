@@ -1,6 +1,6 @@
 #include "wifi/settings/adapter_capability.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <memory>
 #include <string>
@@ -14,6 +14,8 @@
 namespace vornwireless {
 namespace wifi {
 namespace {
+
+using ::testing::HasSubstr;
 
 using Capability = std::unique_ptr<AdapterCapability>;
 
@@ -47,20 +49,18 @@ TEST_F(AdapterCapabilityTest, VerifyOrderAndLimits) {
     AdapterConfig config = config_;
     config.max_num_client = 256;
     config.guest_max_num_client = 257;
-    EXPECT_NE(Refusal(*general, config).find("Failed to verify guest max number client"),
-              std::string::npos);
+    EXPECT_THAT(Refusal(*general, config), HasSubstr("Failed to verify guest max number client"));
     config.max_num_client = 257;
-    EXPECT_NE(Refusal(*general, config).find("Failed to verify max number client"),
-              std::string::npos);
+    EXPECT_THAT(Refusal(*general, config), HasSubstr("Failed to verify max number client"));
     config.guest_encryption = WIFI_ENCRYPTION_ERROR;
-    EXPECT_NE(Refusal(*general, config).find("verify guest encryption"), std::string::npos);
+    EXPECT_THAT(Refusal(*general, config), HasSubstr("verify guest encryption"));
     config.tx_power = WIFI_POWER(5);
     config.security = WIFI_SECURITY_ERROR;
-    EXPECT_NE(Refusal(*general, config).find("Failed to verify power"), std::string::npos);
+    EXPECT_THAT(Refusal(*general, config), HasSubstr("Failed to verify power"));
     config.bandwidth = WIFI_BANDWIDTH_20_40_80MHZ;
-    EXPECT_NE(Refusal(*general, config).find("Failed to verify bandwidth"), std::string::npos);
+    EXPECT_THAT(Refusal(*general, config), HasSubstr("Failed to verify bandwidth"));
     config.mode = WIFI_MODE_BG;
-    EXPECT_NE(Refusal(*general, config).find("Failed to verify mode"), std::string::npos);
+    EXPECT_THAT(Refusal(*general, config), HasSubstr("Failed to verify mode"));
 
     // A station's mode is the remote network's business.
     Adapter::SwitchTopology(WIFI_TOPOLOGY_CLIENT);
@@ -68,7 +68,7 @@ TEST_F(AdapterCapabilityTest, VerifyOrderAndLimits) {
     station.mode = WIFI_MODE_ERROR;
     EXPECT_EQ(Refusal(*general, station), "");
     Adapter::SwitchTopology(WIFI_TOPOLOGY_REPEATER);
-    EXPECT_NE(Refusal(*general, station).find("Failed to verify topology"), std::string::npos);
+    EXPECT_THAT(Refusal(*general, station), HasSubstr("Failed to verify topology"));
 }
 
 TEST_F(AdapterCapabilityTest, ModelRadiosChannelsAndFiveGigahertz) {
@@ -94,7 +94,7 @@ TEST_F(AdapterCapabilityTest, ModelRadiosChannelsAndFiveGigahertz) {
     AdapterConfig config = config_;
     config.bandwidth = WIFI_BANDWIDTH_20_40_80MHZ;
     config.mode = WIFI_MODE_BN;
-    EXPECT_NE(Refusal(*rlt, config).find("Failed to verify mode"), std::string::npos);
+    EXPECT_THAT(Refusal(*rlt, config), HasSubstr("Failed to verify mode"));
     config.mode = WIFI_MODE_AN_AC;
     root_.ClearCalls();
     EXPECT_EQ(Refusal(*rlt, config), "");
@@ -104,8 +104,7 @@ TEST_F(AdapterCapabilityTest, ModelRadiosChannelsAndFiveGigahertz) {
     root_.WriteFile("/sys/class/net/wlan0/operstate", "down\n");
     root_.Scenario("iwlist", "when wlan0 scanning\nexit 1\n");
     root_.ClearCalls();
-    EXPECT_NE(Refusal(*rlt, config).find("Failed to check and enable 5g mode for (wlan0)"),
-              std::string::npos);
+    EXPECT_THAT(Refusal(*rlt, config), HasSubstr("Failed to check and enable 5g mode for (wlan0)"));
     EXPECT_TRUE(log_.Contains("Failed to iwlist scanning for (wlan0)"));
     EXPECT_EQ(root_.Calls(), (std::vector<std::string>{"/sbin/ip link set dev wlan0 up",
                                                        "/sbin/iwlist wlan0 scanning"}));

@@ -32,15 +32,11 @@ TEST(EnumMapTest, ValuesStringsAndAliases) {
     ExpectRoundTrips<WIFI_OPMODE>();
     EXPECT_TRUE(log.Lines().empty());
 
-    EXPECT_EQ(EnumMap<WIFI_MODE>::StringToEnum("an"), 5);
-    EXPECT_EQ(EnumMap<WIFI_MODE>::StringToEnum("gn"), 7);
+    // The numbers other files carry.
     EXPECT_EQ(EnumMap<WIFI_MODE>::EnumToString(WIFI_MODE(11)), "an+ac");
-    EXPECT_EQ(EnumMap<WIFI_MODE>::EnumToString(WIFI_MODE(12)), "error");
-    EXPECT_EQ(EnumMap<WIFI_POWER>::EnumToString(WIFI_POWER(6)), "medium");
-    EXPECT_EQ(EnumMap<WIFI_POWER>::EnumToString(WIFI_POWER(5)), "error");
     EXPECT_EQ(EnumMap<WIFI_STATUS>::EnumToString(WIFI_STATUS(2)), "IPConflict");
-    EXPECT_EQ(EnumMap<WIFI_STATUS>::StringToEnum("IPFailed"), 3);
-    EXPECT_EQ(EnumMap<WIFI_TOPOLOGY>::StringToEnum("repeater"), 4);
+    EXPECT_EQ(EnumMap<WIFI_POWER>::EnumToString(WIFI_POWER(6)), "medium");
+    EXPECT_EQ(EnumMap<WIFI_POWER>::EnumToString(WIFI_POWER(5)), "error");  // a gap
 
     // Aliases parse; the key-order walk answers with the byte-wise first alias.
     for (const char* word : {"Managed", "Infra", "In", "Any"}) {
