@@ -14,6 +14,6 @@ c++ -std=c++17 "$@" "$source/tests/install/consumer.cpp" -o "$scratch/consumer" 
 libdir=$(dirname "$(find "$scratch/prefix" -name 'libvornnetwork.so.5' | head -n 1)")
 LD_LIBRARY_PATH=$libdir "$scratch/consumer" "$scratch/out.conf"
 grep -q 'next=192.168.2.0' "$scratch/out.conf"
-for program in sbin/vornnetd sbin/vornwifid sbin/vornnetdtool bin/vornwireless; do
+for program in sbin/vornnetd sbin/vornwifid sbin/vornnetdtool bin/vornwireless etc/rc.network; do
     "$scratch/prefix/$program" --help > /dev/null
 done
