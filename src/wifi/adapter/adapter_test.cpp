@@ -16,6 +16,7 @@ namespace wifi {
 namespace {
 
 using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using Kind = AdapterAgent::Kind;
 
@@ -115,9 +116,7 @@ TEST_F(AdapterTest, AgentChoiceByDriverModelAndTopology) {
 
     EXPECT_EQ(Adapter::AddAdapter("wlan0"), 0);  // its RLT agent exists
     EXPECT_EQ(Adapter::RefreshAdapterList(), 0);
-    EXPECT_EQ(root_.ReadFile("/etc/vorninfo.conf").find("support_net_topology=\"yes\"") !=
-                  std::string::npos,
-              true);
+    EXPECT_THAT(root_.ReadFile("/etc/vorninfo.conf"), HasSubstr("support_net_topology=\"yes\""));
 }
 
 TEST_F(AdapterTest, ApplyReloadsByFlagsAndTheScheduleSwitchesByTheHour) {
