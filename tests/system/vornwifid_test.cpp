@@ -287,6 +287,27 @@ TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
     ExpectServing();
 }
 
+TEST_F(VornwifidTest, GuardedTopologySwitchGoesBackUnlessConfirmed) {
+    ASSERT_NO_FATAL_FAILURE(Start());
+    const std::string tool = VORN_BINARY_DIR "/tools/vornwireless";
+    const auto bridge = [] { return Parsed(Call("GetBridgeList"))[0]["ifname"].asString(); };
+    std::string err;
+    EXPECT_EQ(RunProgram({tool, "--switch-topology", "bridge", "--confirm-within", "1"},
+                         kCallTimeout, nullptr, &err),
+              1);
+    EXPECT_THAT(err, HasSubstr("no confirmation within 1 s: switched back to router"));
+    EXPECT_EQ(bridge(), "lbr0");
+
+    DaemonProcess guard({tool, "--switch-topology", "bridge", "--confirm-within", "60"});
+    ASSERT_TRUE(WaitFor([&] { return guard.Stdout().find("--confirm") != std::string::npos; },
+                        kCallTimeout))
+        << guard.Stderr();
+    EXPECT_EQ(RunProgram({tool, "--confirm"}, kExitTimeout), 0);
+    EXPECT_EQ(guard.WaitForExit(kExitTimeout), 0);
+    EXPECT_EQ(bridge(), "br0");
+    EXPECT_EQ(RunProgram({tool, "--confirm"}, kExitTimeout), 1);
+}
+
 TEST_F(VornwifidTest, KiteBBuiltInRadioComesUpThroughItsDriverProfile) {
     root_.WriteFile("/etc.defaults/vorninfo.conf",
                     "model=\"kite-b\"\nbuiltin_wlan_mac=\"02:76:6f:72:6e:02\"\n");

@@ -8,6 +8,7 @@
 #include "common/tool_cli.h"
 #include "dbus/wifi_client.h"
 #include "utils/json_text.h"
+#include "vornwireless/topology_guard.h"
 
 namespace {
 
@@ -166,6 +167,10 @@ int main(int argc, char** argv) {
     const CLI::Option* readyOption =
         app.add_flag("--ready", ready, "exit 0 when vornwifid runs and owns its name")
             ->group(group);
+    bool confirm = false;
+    const CLI::Option* confirmOption =
+        app.add_flag("--confirm", confirm, "confirm a switch made with --confirm-within")
+            ->group(group);
     std::vector<Words> words(Commands().size());
     std::vector<const CLI::Option*> options;
     for (std::size_t i = 0; i < Commands().size(); ++i) {
@@ -177,18 +182,33 @@ int main(int argc, char** argv) {
                                         ->expected(command.words);
         options.push_back(option->group(group));
     }
+    int confirmWithin = 0;
+    CLI::Option* guarded =
+        app.add_option("--confirm-within", confirmWithin,
+                       "with --switch-topology: switch back unless --confirm arrives in time")
+            ->type_name("SECONDS")
+            ->check(CLI::Range(1, 86400).description(""))
+            ->needs(app.get_option("--switch-topology"));
     int status = 0;
     if (!vorn::tools::ParseCommandLine(app, argc, argv, "vornwireless", status)) {
         return status;
     }
     std::vector<const CLI::Option*> commands = options;
     commands.push_back(readyOption);
+    commands.push_back(confirmOption);
     if (!vorn::tools::OneCommandGiven("vornwireless", commands)) {
         return 2;
     }
     vorn::tools::SendLogToStderr("vornwireless");
     if (ready) {
         return vorn::tools::ReportReady(WifiClient().IsServerReady());
+    }
+    if (confirm) {
+        return vorn::tools::ConfirmSwitch();
+    }
+    if (guarded->count() > 0) {
+        return vorn::tools::GuardedSwitch(app.get_option("--switch-topology")->as<std::string>(),
+                                          confirmWithin);
     }
     for (std::size_t i = 0; i < options.size(); ++i) {
         if (options[i]->count() > 0) {
