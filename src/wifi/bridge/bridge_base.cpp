@@ -290,9 +290,14 @@ int BridgeBase::AddSlave(const std::string& ifname) {
     if (QLIBCFileExist(("/sys/class/net/" + name + "/brif/" + ifname).c_str()) == 1) {
         return 0;
     }
-    if ((QLIBCFileExist(("/sys/class/net/" + name).c_str()) != 1 &&
-         QLIBCExecl(kBrctl, kExecFlags, "addbr", name.c_str(), nullptr) != 0) ||
-        RunBrctl("addif", name, ifname) != 0) {
+    const bool made = QLIBCFileExist(("/sys/class/net/" + name).c_str()) == 1 ||
+                      QLIBCExecl(kBrctl, kExecFlags, "addbr", name.c_str(), nullptr) == 0;
+    // A mac80211 radio joins a bridge only in access-point mode, which hostapd sets; its
+    // "bridge=" line puts the radio in.
+    if (made && QLIBCFileExist(("/sys/class/net/" + ifname + "/phy80211").c_str()) == 1) {
+        return 0;
+    }
+    if (!made || RunBrctl("addif", name, ifname) != 0) {
         VORN_LOG(LOG_ERR, "Failed to add [%s] into [%s]", ifname.c_str(), name.c_str());
         return -1;
     }

@@ -58,6 +58,11 @@ TEST_F(BridgeTest, TopologyFilesLoadByModel) {
     EXPECT_EQ(Load(WIFI_TOPOLOGY_ROUTER, "gbr0").GetConfig().apIpAddress.ToString(),
               "192.168.200.1");
     EXPECT_EQ(BridgeBase::GetTopology(), WIFI_TOPOLOGY_ROUTER);
+    // hostapd, not brctl, puts a mac80211 radio into its bridge; the bridge is made for it.
+    root_.WriteFile("/sys/class/net/wlan0/phy80211/name", "phy0\n");
+    root_.ClearCalls();
+    EXPECT_EQ(BridgeBase::AddSlave("wlan0"), 0);
+    EXPECT_THAT(root_.Calls(), ElementsAre("/usr/vorn/sbin/brctl addbr lbr0"));
 
     EXPECT_EQ(BridgeBase::SwitchTopology(WIFI_TOPOLOGY_CLIENT), 0);
     EXPECT_THAT(BridgeBase::GetList(), IsEmpty());

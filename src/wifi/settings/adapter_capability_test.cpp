@@ -72,6 +72,13 @@ TEST_F(AdapterCapabilityTest, VerifyOrderAndLimits) {
 }
 
 TEST_F(AdapterCapabilityTest, ModelRadiosChannelsAndFiveGigahertz) {
+    // A cfg80211 radio names no letters to iwconfig; its bands in "iw phy" do.
+    root_.Scenario("iwconfig", "when wlan0\nprint wlan0     IEEE 802.11  ESSID:off/any\n");
+    root_.WriteFile("/sys/class/net/wlan0/phy80211/name", "phy0\n");
+    root_.Scenario("iw", "when phy phy0 info\nprint \tBand 1:\nprint \t\t\tHT20/HT40\n");
+    EXPECT_EQ(Capability(AdapterCapability::Create("wlan0"))->GetMode(),
+              (std::vector<WIFI_MODE>{WIFI_MODE_B, WIFI_MODE_G, WIFI_MODE_N, WIFI_MODE_BN,
+                                      WIFI_MODE_GN}));
     root_.Scenario("iwlist",
                    "when wlan0 active_channel\nprint wlan0     3 channels in total\n"
                    "print  Channel 1 : 2.412 GHz\nprint  Channel 11 : 2.462 GHz\n"

@@ -147,6 +147,35 @@ std::string GetKiteBWlanMacAddress() {
     return IsKiteBModel() ? FactoryValue("builtin_wlan_mac") : "";
 }
 
+namespace {
+
+// The letters cfg80211 radios leave out of iwconfig's "IEEE 802.11", from their bands in
+// "iw phy PHY info": band 1 is 2.4 GHz (b, g), band 2 is 5 GHz (a); HT rates add n.
+std::string BandLetters(const std::string& ifname) {
+    std::string phy;
+    std::ifstream(vorn::platform::RootPath("/sys/class/net/" + ifname + "/phy80211/name")) >> phy;
+    std::vector<std::string> lines;
+    if (!vornwireless::utils::IsValidInterfaceName(phy) ||
+        vorn::platform::ReadShellCommandLines(
+            "/usr/sbin/iw phy '" + phy + "' info | grep -E '^.Band [0-9]+:|HT20'", lines) != 0) {
+        return "";
+    }
+    std::string letters;
+    for (const auto& line : lines) {
+        if (line.rfind("\tBand 1:", 0) == 0) {
+            letters += "bg";
+        } else if (line.rfind("\tBand 2:", 0) == 0) {
+            letters += "a";
+        } else if (line.find("HT20") != std::string::npos &&
+                   letters.find('n') == std::string::npos) {
+            letters += "n";
+        }
+    }
+    return letters;
+}
+
+}  // namespace
+
 int GetSupportedMode(const std::string& ifname, std::string& modes) {
     modes.clear();
     if (!vornwireless::utils::IsValidInterfaceName(ifname)) {
@@ -160,6 +189,9 @@ int GetSupportedMode(const std::string& ifname, std::string& modes) {
     }
     for (const auto& line : lines) {
         modes += line;
+    }
+    if (modes == "802.11") {
+        modes += BandLetters(ifname);
     }
     return 0;
 }
