@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <chrono>
 #include <csignal>
 #include <cstdio>
@@ -34,7 +35,8 @@ int GuardedSwitch(const std::string& topology, int seconds) {
     // A guard whose process is gone (killed, the appliance restarted) waits for nobody.
     int holder = 0;
     if (FILE* stale = std::fopen(guard.c_str(), "re")) {
-        if (std::fscanf(stale, "%d", &holder) != 1 || (holder > 0 && kill(holder, 0) != 0)) {
+        if (std::fscanf(stale, "%d", &holder) != 1 || holder <= 0 ||
+            (kill(holder, 0) != 0 && errno == ESRCH)) {
             unlink(guard.c_str());
         }
         std::fclose(stale);
