@@ -119,7 +119,7 @@ std::vector<std::string> Lines(const std::string& text) {
 
 Json::Value Parse(const std::string& text) {
     Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value)) << text;
+    EXPECT_TRUE(vornwireless::utils::ParseJson(text, value, 1 << 24)) << text;
     return value;
 }
 

@@ -52,9 +52,7 @@ Answer Call(const char* method, const std::string& a, const std::string& b) {
 }
 
 Json::Value Parsed(const Answer& answer) {
-    Json::Value value;
-    EXPECT_TRUE(vornwireless::utils::ParseJson(answer.text, value, 1 << 24)) << answer.text;
-    return value;
+    return Parse(answer.text);
 }
 
 // Every regular file of the root with its content, the simulator's own records left out.
@@ -285,27 +283,6 @@ TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
     EXPECT_EQ(RunProgram({kVornwifid, "--help"}, kExitTimeout, &out), 0);
     EXPECT_THAT(out, AllOf(HasSubstr("Usage: vornwifid"), HasSubstr("--foreground")));
     ExpectServing();
-}
-
-TEST_F(VornwifidTest, GuardedTopologySwitchGoesBackUnlessConfirmed) {
-    ASSERT_NO_FATAL_FAILURE(Start());
-    const std::string tool = VORN_BINARY_DIR "/tools/vornwireless";
-    const auto bridge = [] { return Parsed(Call("GetBridgeList"))[0]["ifname"].asString(); };
-    std::string err;
-    EXPECT_EQ(RunProgram({tool, "--switch-topology", "bridge", "--confirm-within", "1"},
-                         kCallTimeout, nullptr, &err),
-              1);
-    EXPECT_THAT(err, HasSubstr("no confirmation within 1 s: switched back to router"));
-    EXPECT_EQ(bridge(), "lbr0");
-
-    DaemonProcess guard({tool, "--switch-topology", "bridge", "--confirm-within", "60"});
-    ASSERT_TRUE(WaitFor([&] { return guard.Stdout().find("--confirm") != std::string::npos; },
-                        kCallTimeout))
-        << guard.Stderr();
-    EXPECT_EQ(RunProgram({tool, "--confirm"}, kExitTimeout), 0);
-    EXPECT_EQ(guard.WaitForExit(kExitTimeout), 0);
-    EXPECT_EQ(bridge(), "br0");
-    EXPECT_EQ(RunProgram({tool, "--confirm"}, kExitTimeout), 1);
 }
 
 TEST_F(VornwifidTest, KiteBBuiltInRadioComesUpThroughItsDriverProfile) {

@@ -66,13 +66,18 @@ since() { awk -v a="$1" '{ printf "%.1f", $1 - a }' /proc/uptime; }
 # beacon SSID: whether the station's radio hears the access point SSID.
 beacon() { ip netns exec sta iw dev wlan1 scan freq 2437 | grep -q "SSID: $1\$"; }
 
-# The access point "vorn-vm" (WPA2-PSK) on wlan0 and a station that joins it.
-serve_and_join() {
-    apply_adapter wlan0 'enabled=True, ssid="vorn-vm", mode="g", security="PERSONAL_WPA2",
-        encryption="AES", password="vorn-secret-123", channel=6'
-    station '	ssid="vorn-vm"
+psk='	ssid="vorn-vm"
 	key_mgmt=WPA-PSK
 	psk="vorn-secret-123"'
+
+# The access point "vorn-vm" (WPA2-PSK) on wlan0, timed to its first beacon, and a station in it.
+serve_and_join() {
+    start=$(now)
+    apply_adapter wlan0 'enabled=True, ssid="vorn-vm", mode="g", security="PERSONAL_WPA2",
+        encryption="AES", password="vorn-secret-123", channel=6'
+    waitfor 100 beacon vorn-vm || fail "no beacon of vorn-vm"
+    echo "first beacon $(since "$start") s after the ApplyAdapter call"
+    station "$psk"
     waitfor 100 associated || fail "the station did not associate"
 }
 
@@ -85,6 +90,7 @@ start_appliance() {
     iw phy "$(cat /sys/class/net/wlan1/phy80211/name)" set netns name sta ||
         fail "cannot move wlan1 into its namespace"
     ip netns exec sta ip link set lo up
+    ip netns exec sta ip link set wlan1 up
     mkdir -p /var/spool/cron/crontabs /var/packages/Linkyard/target/data
     for folder in etc etc.defaults usr; do
         cp -R "$source/sim/root/$folder" /
@@ -94,12 +100,12 @@ start_appliance() {
         cp /usr/vorn/etc.defaults/wifi/wifi_topology_router_kite /usr/vorn/etc/wifi/wifi_topology_router
     fi
     mkdir -p /usr/vorn/sbin /usr/vorn/bin /lib/udev/script /usr/vorn/etc/rc.d /run/vorn
-    ln -sf "$source/src/platform/rc.network" /etc/rc.network
-    ln -sf /usr/sbin/brctl /usr/vorn/sbin/brctl
-    ln -sf /usr/sbin/hostapd_cli /usr/bin/hostapd_cli
-    ln -sf /usr/sbin/ethtool /usr/vorn/bin/ethtool
-    ln -sf "$build/tools/vornnetdtool" /usr/vorn/sbin/vornnetdtool
-    ln -sf "$build/tools/vornwireless" /usr/vorn/bin/vornwireless
+    for link in "$source/src/platform/rc.network:/etc/rc.network" /usr/sbin/brctl:/usr/vorn/sbin/brctl \
+        /usr/sbin/hostapd_cli:/usr/bin/hostapd_cli /usr/sbin/ethtool:/usr/vorn/bin/ethtool \
+        "$build/tools/vornnetdtool:/usr/vorn/sbin/vornnetdtool" \
+        "$build/tools/vornwireless:/usr/vorn/bin/vornwireless"; do
+        ln -sf "${link%%:*}" "${link#*:}"
+    done
     # What the appliance's other packages do there has no part in these scenarios.
     for script in /usr/vorn/etc/iptables_guest_net.sh /lib/udev/script/usb-wifi-util.sh \
         /usr/vorn/etc/rc.d/S98upnpd.sh; do

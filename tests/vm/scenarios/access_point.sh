@@ -8,18 +8,7 @@
 set -u
 . "$1/tests/vm/appliance.sh"
 start_appliance "$1" "$2" kite-a
-psk='	ssid="vorn-vm"
-	key_mgmt=WPA-PSK
-	psk="vorn-secret-123"'
-
-ip netns exec sta ip link set wlan1 up
-start=$(now)
-apply_adapter wlan0 'enabled=True, ssid="vorn-vm", mode="g", security="PERSONAL_WPA2",
-    encryption="AES", password="vorn-secret-123", channel=6'
-waitfor 100 beacon vorn-vm || fail "no beacon of vorn-vm"
-echo "first beacon $(since "$start") s after the ApplyAdapter call"
-station "$psk"
-waitfor 100 associated || fail "the station did not associate"
+serve_and_join
 lease 192.168.100.
 reaches 192.168.100.1 || fail "the station cannot reach lbr0"
 mac=$(ip netns exec sta cat /sys/class/net/wlan1/address)
@@ -29,6 +18,12 @@ vornwireless --get-connection-list wlan0 --compact | grep -q "$mac" || fail "sta
 waitfor 50 sh -c "vornnetdtool --get-device-list wifi --compact | grep -q '$mac'" ||
     fail "device list: $(vornnetdtool --get-device-list wifi --compact)"
 echo "PASS 1: $mac at $address on the access point and in the device list"
+nft list table ip vorn | grep -q 'ip saddr 192.168.100.0/24 oifname != .* masquerade' ||
+    fail "no NAT: $(nft list ruleset)"
+/etc/rc.network start-mesh wlan0 2>/dev/null
+[ $? = 2 ] || fail "the network script took an unknown verb"
+/etc/rc.network start-nat 'lbr0;reboot' 2>/dev/null
+[ $? = 1 ] || fail "the network script took a bad interface name"
 
 apply_adapter wlan0 'guest_enabled=True, guest_ssid="vorn-guest", guest_security="disabled",
     guest_allow_access_lan=False'

@@ -1,7 +1,7 @@
 #!/bin/sh
 # Topology round trip router -> bridge -> router with a station on the access point: after each
 # switch the bridge, its slaves and the access point are as the topology says and the station is
-# back. Then a guarded switch to bridge that nobody confirms goes back to router on its own.
+# back. Then guarded switches: a confirmed one stays, one that nobody confirms goes back.
 set -u
 . "$1/tests/vm/appliance.sh"
 start_appliance "$1" "$2"
@@ -30,8 +30,13 @@ vornwireless --switch-topology router || fail "SwitchTopology router refused"
 in_topology lbr0 br0
 echo "PASS: router -> bridge -> router, station back after $(since "$start") s"
 
-vornwireless --switch-topology bridge --confirm-within 3 >/dev/null 2>/tmp/guard.log &&
+vornwireless --switch-topology bridge --confirm-within 300 >/tmp/guard.log 2>&1 &
+waitfor 300 grep -q -- --confirm /tmp/guard.log || fail "guard: $(cat /tmp/guard.log)"
+vornwireless --confirm || fail "--confirm refused"
+wait $! || fail "a confirmed switch did not stay: $(cat /tmp/guard.log)"
+in_topology br0 lbr0
+vornwireless --switch-topology router --confirm-within 3 >/dev/null 2>/tmp/guard.log &&
     fail "an unconfirmed switch stayed"
-grep -q "switched back to router" /tmp/guard.log || fail "guard: $(cat /tmp/guard.log)"
-in_topology lbr0 br0
-echo "PASS: unconfirmed switch to bridge went back to router"
+grep -q "switched back to bridge" /tmp/guard.log || fail "guard: $(cat /tmp/guard.log)"
+in_topology br0 lbr0
+echo "PASS: a confirmed switch stays, an unconfirmed one goes back"
