@@ -99,27 +99,4 @@ TEST_F(QlibcProcTest, KillByNameMatchesTheWholeProgramName) {
     EXPECT_EQ(QLIBCProcKillByName("", SIGTERM), -1);
 }
 
-TEST_F(QlibcProcTest, PidFiles) {
-    ASSERT_EQ(QLIBCProcPidFileCreate("/var/run/test.pid"), 0);
-    EXPECT_EQ(root_.ReadFile("/var/run/test.pid"), std::to_string(getpid()) + "\n");
-    EXPECT_EQ(QLIBCReadPidFile("/var/run/test.pid"), getpid());
-    EXPECT_EQ(QLIBCProcAlive(getpid()), 1);
-    EXPECT_EQ(QLIBCProcAlive(0), 0);
-    EXPECT_EQ(QLIBCReadPidFile("/var/run/none.pid"), -1);
-    root_.WriteFile("/var/run/junk.pid", "not a pid\n");
-    EXPECT_EQ(QLIBCReadPidFile("/var/run/junk.pid"), 0);
-    const pid_t child = fork();
-    if (child == 0) {
-        pause();
-        _exit(0);
-    }
-    root_.WriteFile("/var/run/child.pid", std::to_string(child) + "\n");
-    ASSERT_EQ(QLIBCProcSignalByPidFile("/var/run/child.pid", SIGTERM), 0);
-    int status = 0;
-    ASSERT_EQ(waitpid(child, &status, 0), child);
-    EXPECT_TRUE(WIFSIGNALED(status));
-    EXPECT_EQ(QLIBCProcAlive(child), 0);
-    EXPECT_EQ(QLIBCProcSignalByPidFile("/var/run/none.pid", SIGTERM), -1);
-}
-
 }  // namespace

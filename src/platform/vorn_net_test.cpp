@@ -95,25 +95,6 @@ TEST_F(VornNetTest, EventLogLinesStayOneLineEach) {
                                         "\t2\t1\t0x0000000B\tforged 2000-01-01 line\n"));
 }
 
-TEST_F(VornNetTest, ResolverFileJoinsBothFamiliesOnce) {
-    root_.WriteFile("/etc/resolv.conf", "nameserver 9.9.9.9\n");
-    ASSERT_EQ(VORNNetDNSUpdate(), 0);
-    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"), "");
-    root_.WriteFile("/etc/iproute2/config/resolv4.conf",
-                    "nameserver 10.0.0.1\nnameserver 10.0.0.2\nnameserver 10.0.0.1\n");
-    root_.WriteFile("/etc/iproute2/config/resolv6.conf",
-                    "nameserver fe80::1\n\nnameserver 10.0.0.2\nnameserver 2001:db8::53");
-    ASSERT_EQ(VORNNetDNSUpdate(), 0);
-    const std::string joined =
-        "nameserver 10.0.0.1\nnameserver 10.0.0.2\nnameserver fe80::1\n"
-        "nameserver 2001:db8::53\n";
-    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"), joined);
-    // A source that is not text leaves the system file as it was.
-    root_.WriteFile("/etc/iproute2/config/resolv6.conf", std::string("nameserver \0::1\n", 16));
-    EXPECT_EQ(VORNNetDNSUpdate(), -1);
-    EXPECT_EQ(root_.ReadFile("/etc/resolv.conf"), joined);
-}
-
 TEST_F(VornNetTest, PPPoERelayFollowsEachInterfaceFileAndSkipsBadNames) {
     root_.WriteFile(kIfcfg + "eth0", "DEVICE=eth0\nPPPOE_RELAY=\"yes\"\n");
     root_.WriteFile(kIfcfg + "eth1", "DEVICE=eth1\nPPPOE_RELAY=no\n");

@@ -56,28 +56,6 @@ class ArpScannerTest : public vorn::test::RootTest {
     ArpScanner* scanner_ = ArpScanner::Inst();
 };
 
-// A router's naming by lease is proved with dnsmasq by the system test; a bridge asks NetBIOS
-// about every client, a client asks nothing.
-TEST_F(ArpScannerTest, TopologyDecidesWhomToAskForNames) {
-    SetTopology("bridge");
-    root_.Scenario("arp", kArpTable);
-    ASSERT_EQ(scanner_->GetArpTable(), 0);
-    EXPECT_EQ(Client(0)["displayName"], "General DMA");
-    EXPECT_EQ(Client(1)["friendlyName"], "laptop");
-    EXPECT_EQ(Client(2)["friendlyName"], "PRINTER01");
-    EXPECT_EQ(Client(2)["netif"], "lbr0");
-    EXPECT_THAT(root_.Calls(),
-                ElementsAre("/sbin/arp -a", "/usr/vorn/bin/nmblookup -A 192.168.1.10",
-                            "/usr/vorn/bin/nmblookup -A 192.168.1.12"));
-
-    root_.ClearCalls();
-    scanner_->EraseList();
-    SetTopology("client");
-    ASSERT_EQ(scanner_->GetArpTable(), 0);
-    EXPECT_THAT(root_.Calls(), IsEmpty());
-    EXPECT_TRUE(scanner_->GetClientList()["ClientList"].empty());
-}
-
 TEST_F(ArpScannerTest, HostileLinesAreSkippedBeforeAnyCommand) {
     SetTopology("bridge");
     ASSERT_EQ(scanner_->GetArpTable(), 0);  // sets the topology; the table is empty

@@ -177,16 +177,5 @@ TEST_F(IPv6ModuleTest, PacketsGiveRouterPrefixAndFlagsAndMalformedOnesAreDropped
     EXPECT_EQ(log_.Matching("Invalid router advertisement from").size(), 2u);
 }
 
-TEST_F(IPv6ModuleTest, ListeningThreadEndsWithTheModule) {
-    // Without a socket the thread waits on its wake-up pipe alone; the sanitizers catch a thread
-    // left running on freed memory.
-    IPv6Module terminated;
-    EXPECT_EQ(terminated.StartModule(), 0);
-    EXPECT_EQ(terminated.TerminateModule(), 0);
-    EXPECT_EQ(terminated.TerminateModule(), 0);
-    EXPECT_EQ(IPv6Module().StartModule(), 0);
-    EXPECT_THAT(log_.Lines(), IsEmpty());
-}
-
 }  // namespace
 }  // namespace vornnetwork::network::module

@@ -170,18 +170,5 @@ TEST_F(PolicyRouteTest, UntrustedValuesNeverReachACommandOrAFile) {
     EXPECT_TRUE(log_.Contains("Can't find [eth9-table] in file [" + std::string(kMulti) + "]."));
 }
 
-TEST_F(PolicyRouteTest, SubnetFormatClearsHostBitsAndRefusesHoles) {
-    std::string subnet;
-    const char* const cases[][3] = {{"10.200.3.4", "255.192.0.0", "10.192.0.0/10"},
-                                    {"10.0.0.9", "255.255.255.255", "10.0.0.9/32"}};
-    for (const auto& c : cases) {
-        ASSERT_EQ(GetSubnetFormat(c[0], c[1], subnet), 0) << c[0];
-        EXPECT_EQ(subnet, c[2]);
-    }
-    EXPECT_EQ(GetSubnetFormat("10.0.0.9", "255.0.255.0", subnet), -1);
-    EXPECT_EQ(GetSubnetFormat("10.0.0", "255.0.0.0", subnet), -1);
-    EXPECT_EQ(subnet, "10.0.0.9/32");
-}
-
 }  // namespace
 }  // namespace vornnetwork::network

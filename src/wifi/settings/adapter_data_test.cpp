@@ -1,8 +1,6 @@
 #include "wifi/settings/adapter_data.h"
 
 #include <gmock/gmock.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <memory>
 #include <string>
@@ -229,24 +227,6 @@ TEST_F(AdapterDataTest, DamagedFilesAreNotUsed) {
     root_.WriteFile(kAp, ap + "[general]\n\tchannel=3\n");
     ASSERT_EQ(data->Read(), 0);
     EXPECT_EQ(data->GetConfig().channel, 3);
-}
-
-TEST_F(AdapterDataTest, AnotherProcessReadsWhatOneWrote) {
-    Data reader(AdapterData::Create("wlan0"));
-    const AdapterConfig full = Full(reader->GetConfig());
-    const pid_t child = fork();
-    ASSERT_GE(child, 0);
-    if (child == 0) {
-        Data writer(AdapterData::Create("wlan0"));
-        writer->SetConfig(full);
-        writer->Write();
-        _exit(writer->GetConfig() == full ? 0 : 1);
-    }
-    int status = -1;
-    ASSERT_EQ(waitpid(child, &status, 0), child);
-    ASSERT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
-    ASSERT_EQ(reader->Read(), 0);
-    EXPECT_EQ(reader->GetConfig(), full);
 }
 
 }  // namespace
