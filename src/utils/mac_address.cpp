@@ -30,13 +30,13 @@ MacAddress& MacAddress::operator=(const std::string& text) {
     return *this;
 }
 
-bool MacAddress::IsFormalized() const {
-    if (text_.size() != kFormalizedLength) {
+bool MacAddress::IsFormalized(const std::string& text) {
+    if (text.size() != kFormalizedLength) {
         return false;
     }
-    for (std::string::size_type i = 0; i < text_.size(); ++i) {
+    for (std::string::size_type i = 0; i < text.size(); ++i) {
         const bool separatorPosition = i % 3 == 2;
-        if (separatorPosition ? text_[i] != ':' : !IsHexDigit(text_[i])) {
+        if (separatorPosition ? text[i] != ':' : !IsHexDigit(text[i])) {
             return false;
         }
     }

@@ -17,7 +17,9 @@ class MacAddress {
     MacAddress& operator=(const std::string& text);
 
     // Six two-digit hex groups joined by ':'.
-    bool IsFormalized() const;
+    bool IsFormalized() const { return IsFormalized(text_); }
+    // The same test of any text, without making (and so formalizing and logging) an address.
+    static bool IsFormalized(const std::string& text);
     // Exactly twelve hex digits; logs why not.
     bool IsFormalizable() const;
     // 0 when the text is (now) formalized, -1 when it is left as it was.

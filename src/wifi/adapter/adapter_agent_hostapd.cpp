@@ -302,11 +302,10 @@ double ReadMaxPower(int channel) {
 
 // The lines of "hostapd_cli all_sta": a MAC address line starts a station, its keys follow.
 std::vector<utils::ConnectionInfo> ParseStations(const std::vector<std::string>& lines) {
-    constexpr std::string::size_type kMacLength = 17;
     const std::string timeKey = "connected_time=";
     std::vector<utils::ConnectionInfo> stations;
     for (const std::string& line : lines) {
-        if (line.size() == kMacLength && MacAddress(line).IsFormalized()) {
+        if (MacAddress::IsFormalized(line)) {
             stations.emplace_back();
             stations.back().mac = MacAddress(line);
         } else if (!stations.empty() && line.compare(0, timeKey.size(), timeKey) == 0) {
