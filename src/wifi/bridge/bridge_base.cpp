@@ -294,7 +294,7 @@ int BridgeBase::AddSlave(const std::string& ifname) {
                       QLIBCExecl(kBrctl, kExecFlags, "addbr", name.c_str(), nullptr) == 0;
     // A mac80211 radio joins a bridge only in access-point mode, which hostapd sets; its
     // "bridge=" line puts the radio in.
-    if (made && QLIBCFileExist(("/sys/class/net/" + ifname + "/phy80211").c_str()) == 1) {
+    if (made && !utils::GetPhyName(ifname).empty()) {
         return 0;
     }
     if (!made || RunBrctl("addif", name, ifname) != 0) {

@@ -152,10 +152,9 @@ namespace {
 // The letters cfg80211 radios leave out of iwconfig's "IEEE 802.11", from their bands in
 // "iw phy PHY info": band 1 is 2.4 GHz (b, g), band 2 is 5 GHz (a); HT rates add n.
 std::string BandLetters(const std::string& ifname) {
-    std::string phy;
-    std::ifstream(vorn::platform::RootPath("/sys/class/net/" + ifname + "/phy80211/name")) >> phy;
+    const std::string phy = GetPhyName(ifname);
     std::vector<std::string> lines;
-    if (!vornwireless::utils::IsValidInterfaceName(phy) ||
+    if (phy.empty() ||
         vorn::platform::ReadShellCommandLines(
             "/usr/sbin/iw phy '" + phy + "' info | grep -E '^.Band [0-9]+:|HT20'", lines) != 0) {
         return "";
@@ -175,6 +174,16 @@ std::string BandLetters(const std::string& ifname) {
 }
 
 }  // namespace
+
+std::string GetPhyName(const std::string& ifname) {
+    std::string phy;
+    if (vornwireless::utils::IsValidInterfaceName(ifname)) {
+        std::ifstream(vorn::platform::RootPath("/sys/class/net/" + ifname + "/phy80211/name")) >>
+            phy;
+    }
+    // The name goes onto iw's command line.
+    return vornwireless::utils::IsValidInterfaceName(phy) ? phy : "";
+}
 
 int GetSupportedMode(const std::string& ifname, std::string& modes) {
     modes.clear();

@@ -40,6 +40,8 @@ std::string GetKiteBWlanMacAddress();
 // What the radio reports as its 802.11 modes (the seventh blank-separated word of iwconfig's
 // "IEEE 802.11" line, e.g. "802.11bgn"). 0, or -1 when the command cannot be started.
 int GetSupportedMode(const std::string& ifname, std::string& modes);
+// The wiphy of a mac80211 radio ("phy0"); "" for any other interface.
+std::string GetPhyName(const std::string& ifname);
 
 // Only "wlan0" of a Kite model carries a guest network.
 bool IsGuestNetworkSupport(const std::string& ifname);
