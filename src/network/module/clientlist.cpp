@@ -35,21 +35,6 @@ std::string TextOf(const Json::Value& object, const char* key) {
     return value.isConvertibleTo(Json::stringValue) ? value.asString() : "";
 }
 
-// The walk stops at the first entry without the key, which hides every later entry.
-bool FindIndex(const Json::Value& list, const char* key, const std::string& text, unsigned& index) {
-    for (Json::ArrayIndex i = 0; i < list.size(); ++i) {
-        const Json::Value& entry = list[i];
-        if (!entry.isObject() || !entry.isMember(key)) {
-            return false;
-        }
-        if (entry[key].isString() && entry[key].asString() == text) {
-            index = i;
-            return true;
-        }
-    }
-    return false;
-}
-
 bool IsClientListRoot(const Json::Value& value) {
     return value.isObject() && value.isMember(kListKey) && value[kListKey].isArray();
 }
@@ -85,33 +70,9 @@ std::string DisplayNameOf(const Json::Value& obj) {
     return kDefaultDisplayName;
 }
 
-// Merges obj into the entry whose key holds text, or appends it as a new entry when add is set.
-bool MergeEntry(Json::Value& list, const char* key, const std::string& text, const Json::Value& obj,
-                bool add, const std::string& time) {
-    if (!obj.isObject() || obj.empty()) {
-        VORN_LOG(LOG_ERR, "Error: UpdateKeys - json object member number (%d)", 0);
-        return false;
-    }
-    unsigned index = 0;
-    const bool exists = FindIndex(list, key, text, index);
-    if (!exists && !add) {
-        return true;
-    }
-    Json::Value& entry = exists ? list[index] : list.append(Json::Value(Json::objectValue));
-    for (Json::Value::const_iterator member = obj.begin(); member != obj.end(); ++member) {
-        entry[member.name()] = *member;
-    }
-    if (!exists) {
-        entry[key] = text;
-    }
-    entry[kDisplayNameKey] = DisplayNameOf(entry);
-    entry[kTimeKey] = time;
-    return true;
-}
-
 }  // namespace
 
-ClientList::ClientList() {
+ClientList::ClientList() : byMac_(kMacKey), byIp_(kIpKey) {
     pthread_mutex_init(&mutex, nullptr);
     EraseList();
     finished_ = root;
@@ -128,7 +89,7 @@ bool ClientList::UpdateKeysByMac(const std::string& mac, const Json::Value& obj,
         VORN_LOG(LOG_ERR, "Error: UpdateKeys - MAC address is empty");
         return false;
     }
-    return MergeEntry(root[kListKey], kMacKey, mac, obj, add, time);
+    return Merge(byMac_, mac, obj, add, time);
 }
 
 bool ClientList::UpdateKeysByIP(const std::string& ip, const Json::Value& obj, const bool& add) {
@@ -138,15 +99,51 @@ bool ClientList::UpdateKeysByIP(const std::string& ip, const Json::Value& obj, c
         VORN_LOG(LOG_ERR, "Error: UpdateKeys - IP address is empty");
         return false;
     }
-    return MergeEntry(root[kListKey], kIpKey, ip, obj, add, time);
+    return Merge(byIp_, ip, obj, add, time);
+}
+
+// Merges obj into the entry whose key holds text, or appends it as a new entry when add is set.
+bool ClientList::Merge(ClientIndex& by, const std::string& text, const Json::Value& obj, bool add,
+                       const std::string& time) {
+    if (!obj.isObject() || obj.empty()) {
+        VORN_LOG(LOG_ERR, "Error: UpdateKeys - json object member number (%d)", 0);
+        return false;
+    }
+    Json::Value& list = root[kListKey];
+    Json::ArrayIndex index = 0;
+    const bool exists = by.Find(list, text, index);
+    if (!exists && !add) {
+        return true;
+    }
+    if (exists && (byMac_.Changes(list[index], obj) || byIp_.Changes(list[index], obj))) {
+        ForgetIndexes();
+    }
+    const Json::ArrayIndex position = exists ? index : list.size();
+    Json::Value& entry = exists ? list[index] : list.append(Json::Value(Json::objectValue));
+    for (Json::Value::const_iterator member = obj.begin(); member != obj.end(); ++member) {
+        entry[member.name()] = *member;
+    }
+    if (!exists) {
+        entry[by.Key()] = text;
+        byMac_.Appended(entry, position);
+        byIp_.Appended(entry, position);
+    }
+    entry[kDisplayNameKey] = DisplayNameOf(entry);
+    entry[kTimeKey] = time;
+    return true;
+}
+
+void ClientList::ForgetIndexes() {
+    byMac_.Forget();
+    byIp_.Forget();
 }
 
 bool ClientList::VerifyMacIsExist(const std::string& mac, unsigned& index) {
-    return FindIndex(root[kListKey], kMacKey, mac, index);
+    return byMac_.Find(root[kListKey], mac, index);
 }
 
 bool ClientList::VerifyIPIsExist(const std::string& ip, unsigned& index) {
-    return FindIndex(root[kListKey], kIpKey, ip, index);
+    return byIp_.Find(root[kListKey], ip, index);
 }
 
 std::string ClientList::FindMacByIP(const std::string& ip) {
@@ -174,6 +171,7 @@ bool ClientList::GetObject(const std::string& mac, Json::Value& out) {
 void ClientList::EraseList() {
     ListLock lock(mutex);
     root[kListKey] = Json::Value(Json::arrayValue);
+    ForgetIndexes();
 }
 
 bool ClientList::EraseObject(const std::string& mac) {
@@ -188,6 +186,7 @@ bool ClientList::EraseObject(const std::string& mac) {
         list[index].swap(list[last]);
     }
     list.resize(last);
+    ForgetIndexes();
     return true;
 }
 
@@ -230,6 +229,7 @@ bool ClientList::LoadClientList(const std::string& path) {
     }
     ListLock lock(mutex);
     root.swap(parsed);
+    ForgetIndexes();
     return true;
 }
 

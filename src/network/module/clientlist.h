@@ -6,6 +6,8 @@
 
 #include <string>
 
+#include "network/module/client_index.h"
+
 namespace vornnetwork {
 namespace network {
 namespace module {
@@ -60,6 +62,14 @@ class ClientList {
     pthread_mutex_t mutex;
     Json::Value root;
     Json::Value finished_;
+
+  private:
+    bool Merge(ClientIndex& by, const std::string& text, const Json::Value& obj, bool add,
+               const std::string& time);
+    void ForgetIndexes();
+
+    ClientIndex byMac_;
+    ClientIndex byIp_;
 };
 
 }  // namespace module

@@ -82,11 +82,15 @@ TEST_F(ClientListTest, SearchesStopAtAnEntryWithoutTheKeyAndEraseMovesTheLastEnt
     EXPECT_EQ(list.FindMacByIP("10.0.0.3"), "");  // hidden behind the second entry
     EXPECT_TRUE(list.VerifyMacIsExist("aa:00:00:00:00:03", index));
     EXPECT_EQ(index, 2u);
+    list.UpdateKeysByIP("10.0.0.1", Object({{"ipAddr", "10.0.0.9"}}), false);  // a new lease
+    EXPECT_EQ(list.FindMacByIP("10.0.0.1"), "");
+    EXPECT_EQ(list.FindMacByIP("10.0.0.9"), "aa:00:00:00:00:01");
 
     EXPECT_FALSE(list.EraseObject("aa:00:00:00:00:09"));
     EXPECT_TRUE(list.IsUnlocked());
     EXPECT_TRUE(list.EraseObject("aa:00:00:00:00:01"));
     EXPECT_EQ(list.FindMacByIP("10.0.0.3"), "aa:00:00:00:00:03");
+    EXPECT_EQ(list.FindMacByIP("10.0.0.9"), "");
     EXPECT_EQ(list.GetClientList()["ClientList"][1]["macAddr"], "aa:00:00:00:00:02");
     EXPECT_TRUE(list.IsUnlocked());
 }
