@@ -117,7 +117,14 @@ start_appliance() {
     export ASAN_OPTIONS=detect_leaks=0
     "$build/daemons/vornnetd" --foreground >/tmp/vornnetd.log 2>&1 &
     waitfor 150 "$build/tools/vornnetdtool" --ready || fail "vornnetd did not come up"
-    "$build/daemons/vornwifid" --foreground >/tmp/vornwifid.log 2>&1 &
-    waitfor 300 "$build/tools/vornwireless" --ready || fail "vornwifid did not come up"
+    start_vornwifid
     PATH=$build/tools:$PATH
+}
+
+# Starts vornwifid (its pid in $vornwifid) and waits until it answers.
+start_vornwifid() {
+    "$build/daemons/vornwifid" --foreground >>/tmp/vornwifid.log 2>&1 &
+    # shellcheck disable=SC2034 # the scenarios stop it
+    vornwifid=$!
+    waitfor 300 "$build/tools/vornwireless" --ready || fail "vornwifid did not come up"
 }

@@ -5,6 +5,8 @@
 # 2. The guest network on the same radio: an address in gbr0's subnet and no way into lbr0's.
 # 3. MAC filter: "deny" with the station's MAC keeps it out, "allow" with it lets it in.
 # 4. WPS push button: the station joins without knowing the passphrase.
+# 5. Schedules: with the access point scheduled for this hour only, vornwifid stops, the clock
+#    moves on an hour, and vornwifid's start takes the access point down at once.
 set -u
 . "$1/tests/vm/appliance.sh"
 start_appliance "$1" "$2" kite-a
@@ -51,3 +53,15 @@ vornwireless --enable-wps-pbc wlan0 || fail "EnableWPSWithPBC refused"
 wpa wps_pbc >/dev/null || fail "wps_pbc refused"
 waitfor 150 associated || fail "the station did not join by WPS"
 echo "PASS 4: WPS push button"
+
+hour=$(($(date +%w) * 24 + $(date +%-H)))
+apply_adapter wlan0 "schedule_enabled=True,
+    schedule=''.join('1' if hour == $hour else '0' for hour in range(168))"
+waitfor 150 associated || fail "the station did not stay on the scheduled access point"
+kill "$vornwifid" && wait "$vornwifid"
+pidof hostapd >/dev/null || fail "the access point went down with vornwifid"
+date -s "@$(($(date +%s) + 3600))" >/dev/null || fail "cannot move the clock"
+start=$(now)
+start_vornwifid
+waitfor 150 sh -c '! pidof hostapd' || fail "the access point stayed up out of its hours"
+echo "PASS 5: out of its hours the access point went down $(since "$start") s after vornwifid's start"
