@@ -322,7 +322,7 @@ int StaticRoute::SetRules(IP_TYPE type, const Json::Value& json) {
                 result = -1;
             }
             // Zero-padded so that the file's (name) order is the order given.
-            char name[16];
+            char name[sizeof("route_4294967295")];
             std::snprintf(name, sizeof(name), "route_%04u", static_cast<unsigned>(i));
             config.AddKeyValue(name, "ip", rule.ip.ToString());
             config.AddKeyValue(name, LengthKey(type),
