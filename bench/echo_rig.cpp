@@ -82,6 +82,7 @@ Memory ReadMemory(pid_t pid) {
             clean = kb;
         } else if (key == "Private_Dirty:") {
             dirty = kb;
+            memory.privateDirtyKb = kb;
         }
     }
     if (clean >= 0 && dirty >= 0) {
@@ -99,6 +100,7 @@ void SetMemoryCounters(benchmark::State& state, const std::string& process, cons
     state.counters[process + "_Rss"] = bytes(memory.rss);
     state.counters[process + "_Pss"] = bytes(memory.pss);
     state.counters[process + "_Private"] = bytes(memory.privateKb);
+    state.counters[process + "_PrivateDirty"] = bytes(memory.privateDirtyKb);
 }
 
 }  // namespace bench

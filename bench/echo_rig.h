@@ -47,9 +47,12 @@ struct Memory {
     long long rss = -1;
     long long pss = -1;
     long long privateKb = -1;  // Private_Clean + Private_Dirty
+    // Written pages (heap, stacks, relocated data): what neither sharing nor reclaim takes back.
+    // The clean part is mostly code that no other process of the moment has mapped.
+    long long privateDirtyKb = -1;
 };
 Memory ReadMemory(pid_t pid);
-// The counters PROCESS_Rss, _Pss and _Private, in bytes.
+// The counters PROCESS_Rss, _Pss, _Private and _PrivateDirty, in bytes.
 void SetMemoryCounters(benchmark::State& state, const std::string& process, const Memory& memory);
 
 }  // namespace bench
