@@ -60,6 +60,8 @@ class ClientList {
     };
 
     pthread_mutex_t mutex;
+    // Read-only for the scanners: the look-up indexes below follow the changes made through the
+    // methods above.
     Json::Value root;
     Json::Value finished_;
 
