@@ -2,6 +2,8 @@
 
 #include <benchmark/benchmark.h>
 
+#include <unistd.h>
+
 #include <cstdio>
 #include <fstream>
 #include <sstream>
@@ -26,6 +28,9 @@ int RunWithRig(int argc, char** argv, EchoRig*& rig, const std::function<void(Ec
     if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
         return 1;
     }
+    // Pages of a program or library just built stay dirty in the page cache until written back,
+    // and would count as the daemons' private dirty memory.
+    sync();
     EchoRig theRig;
     if (!theRig.Start()) {
         return 1;
