@@ -12,6 +12,8 @@ fail() {
         /var/run/hostapd-wlan0.conf /tmp/wpa.log; do
         [ -f "$file" ] && { echo "--- $file"; tail -n 25 "$file"; }
     done
+    # Again last, where a shortened log still shows it.
+    echo "FAIL: $*"
     exit 1
 }
 
