@@ -1,7 +1,6 @@
 #include "utils/config.h"
 
 #include <libgen.h>
-#include <unistd.h>
 
 #include <cstdio>
 #include <cstdlib>
@@ -10,7 +9,6 @@
 
 #include "platform/qlibc_container.h"
 #include "platform/qlibc_file.h"
-#include "platform/root_path.h"
 #include "utils/file.h"
 #include "utils/log.h"
 #include "utils/temp_file.h"
@@ -227,11 +225,6 @@ int ConfigNoSection::Write() {
         return -1;
     }
     const char* file = GetNameCString();
-    unlink(vorn::platform::RootPath(file).c_str());
-    if (QLIBCFileTouch(file) < 0) {
-        VORN_LOG(LOG_ERR, "Failed to touch [%s]", file);
-        return -1;
-    }
     HashHolder pairs;
     HashHolder none;
     if (pairs.hash == nullptr || none.hash == nullptr) {
@@ -241,8 +234,24 @@ int ConfigNoSection::Write() {
     for (const auto& pair : pairs_) {
         QLIBCSzHashSetValue(pairs.hash, pair.first.c_str(), pair.second.c_str());
     }
-    if (QLIBCFileSetKeys(file, pairs.hash, none.hash, 0) < 0) {
+    // The pairs go into a fresh empty file beside it, which then replaces the file whole: a
+    // writer killed half-way leaves the previous file, never a torn or missing one.
+    TempFile temp(GetNameString());
+    const bool created = temp.Created();
+    temp.Close();
+    if (!created) {
+        VORN_LOG(LOG_ERR, "Failed to touch [%s]", file);
+        return -1;
+    }
+    const char* tempName = temp.Logical().c_str();
+    if (QLIBCFileSetKeys(tempName, pairs.hash, none.hash, 0) < 0) {
         VORN_LOG(LOG_ERR, "Failed to set keys");
+        QLIBCSysUnlink(tempName);
+        return -1;
+    }
+    if (QLIBCSysRename(tempName, file) != 0) {
+        VORN_LOG(LOG_ERR, "Failed to rename file from [%s] to [%s]", tempName, file);
+        QLIBCSysUnlink(tempName);
         return -1;
     }
     return 0;

@@ -65,7 +65,7 @@ class ConfigSection : public Config {
     Sections sections_;
 };
 
-// A flat key=value file. Written in place (removed, then created anew), not atomically.
+// A flat key=value file. Written atomically too: the pairs alone, in a fresh file.
 class ConfigNoSection : public Config {
   public:
     using Pairs = std::map<std::string, std::string>;
