@@ -17,6 +17,7 @@
 #include "platform/qlibc_proc.h"
 #include "platform/root_path.h"
 #include "platform/shell_command.h"
+#include "platform/text_file.h"
 #include "platform/vorn_net.h"
 #include "utils/config.h"
 #include "utils/interface_name.h"
@@ -92,7 +93,8 @@ bool ReadType(const Json::Value& request, GATEWAY_TYPE& type) {
 
 // A line break or NUL would break the priority file apart.
 bool IsClassText(const std::string& text) {
-    return text.size() <= kMaxClassLength && text.find_first_of(std::string("\n\r\0", 3)) == std::string::npos;
+    return text.size() <= kMaxClassLength &&
+           text.find_first_of(std::string("\n\r\0", 3)) == std::string::npos;
 }
 
 // An address of the request's family in its plain form, "NULL" (keep) or empty (clear).
@@ -463,17 +465,17 @@ int RouteModule::WriteDnsFile(GATEWAY_TYPE type) {
         return -1;
     }
     const char* file = kFamilies[type].resolverFile;
-    FILE* stream = std::fopen(vorn::platform::RootPath(file).c_str(), "w");
-    if (stream == nullptr) {
+    std::string text;
+    for (const GatewayInfo& entry : *list) {
+        if (!entry.dns.IsEmpty()) {
+            text += "nameserver " + entry.dns.ToString() + "\n";
+        }
+    }
+    // Replaced whole: a daemon killed while writing leaves the previous resolver lines.
+    if (!vorn::platform::WriteFileAtomically(vorn::platform::RootPath(file), text)) {
         VORN_LOG(LOG_ERR, "Failed to open file[%s]", file);
         return -1;
     }
-    for (const GatewayInfo& entry : *list) {
-        if (!entry.dns.IsEmpty()) {
-            std::fprintf(stream, "nameserver %s\n", entry.dns.ToCString());
-        }
-    }
-    std::fclose(stream);
     if (QLIBCFileCheckKeyValue(kSettingsFile, "dns_mode", "auto", QLIBC_FILE_IGNORE_CASE) == 1) {
         vornwireless::sdk_s::VORNNetDNSUpdate_S();
     }
