@@ -36,7 +36,8 @@ constexpr const char* kNoLeaseName = "*";  // how dnsmasq marks a lease without 
 
 bool IsIPv4(const std::string& text) {
     in_addr parsed;
-    return inet_pton(AF_INET, text.c_str(), &parsed) == 1;
+    // inet_pton would stop at a NUL and pass whatever follows it.
+    return text.find('\0') == std::string::npos && inet_pton(AF_INET, text.c_str(), &parsed) == 1;
 }
 
 bool IsColonMac(const std::string& text) {
@@ -108,32 +109,43 @@ int ArpScanner::GetArpTable() {
     return 0;
 }
 
-int ArpScanner::AppendClientList(const std::string& line) {
+int ArpScanner::ParseArpLine(const std::string& line, ArpEntry& entry) {
     std::istringstream words(line);
-    std::string name, ip, at, mac, hardwareType, on, ifname;
-    words >> name >> ip >> at >> mac >> hardwareType >> on >> ifname;
-    if (ifname.find(kBridgeMark) == std::string::npos) {
+    std::string at, hardwareType, on;
+    words >> entry.name >> entry.ip >> at >> entry.mac >> hardwareType >> on >> entry.ifname;
+    if (entry.ifname.find(kBridgeMark) == std::string::npos) {
         return 0;
     }
-    ip = WithoutParentheses(ip);
-    if (!IsIPv4(ip) || !IsColonMac(mac) || !vornwireless::utils::IsValidInterfaceName(ifname)) {
+    entry.ip = WithoutParentheses(entry.ip);
+    if (!IsIPv4(entry.ip) || !IsColonMac(entry.mac) ||
+        !vornwireless::utils::IsValidInterfaceName(entry.ifname)) {
         VORN_LOG(LOG_WARNING, "Skip arp entry with a bad address or interface [%s]", line.c_str());
         return -1;
     }
+    return 1;
+}
+
+int ArpScanner::AppendClientList(const std::string& line) {
+    ArpEntry entry;
+    const int parsed = ParseArpLine(line, entry);
+    if (parsed <= 0) {
+        return parsed;
+    }
+    std::string& name = entry.name;
     if (topology == kRouterTopology) {
-        GetDHCPInfoByMAC(mac, name);
+        GetDHCPInfoByMAC(entry.mac, name);
     }
     if (name == kUnknownName || name.empty()) {
-        GetNmbInfoByIP(ip, name);
+        GetNmbInfoByIP(entry.ip, name);
     }
     Json::Value obj(Json::objectValue);
     if (name != kUnknownName && !name.empty()) {
         obj["friendlyName"] = name;
     }
-    obj["netif"] = ifname;
-    obj["ipAddr"] = ip;
-    obj["macAddr"] = mac;
-    if (!UpdateKeysByMac(mac, obj, true)) {
+    obj["netif"] = entry.ifname;
+    obj["ipAddr"] = entry.ip;
+    obj["macAddr"] = entry.mac;
+    if (!UpdateKeysByMac(entry.mac, obj, true)) {
         VORN_LOG(LOG_ERR, "failed to update key for arp data");
         return -1;
     }
@@ -146,10 +158,16 @@ int ArpScanner::GetDHCPInfoByMAC(const std::string& mac, std::string& name) {
         VORN_LOG(LOG_ERR, "Failed to open dhcp leases file");
         return -1;
     }
+    FindLeaseName(vorn::platform::SplitLines(text), mac, name);
+    return 0;
+}
+
+void ArpScanner::FindLeaseName(const std::vector<std::string>& leases, const std::string& mac,
+                               std::string& name) {
     if (mac.empty()) {
-        return 0;
+        return;
     }
-    for (const std::string& line : vorn::platform::SplitLines(text)) {
+    for (const std::string& line : leases) {
         if (line.find(mac) != std::string::npos) {
             // "expiry mac ip name ...": the name is the fourth word.
             std::istringstream words(line);
@@ -159,10 +177,9 @@ int ArpScanner::GetDHCPInfoByMAC(const std::string& mac, std::string& name) {
             if (name == kNoLeaseName) {
                 name.clear();
             }
-            break;
+            return;
         }
     }
-    return 0;
 }
 
 int ArpScanner::GetNmbInfoByIP(const std::string& ip, std::string& name) {

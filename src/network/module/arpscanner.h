@@ -5,6 +5,7 @@
 
 #include <atomic>
 #include <string>
+#include <vector>
 
 #include "network/module/clientlist.h"
 
@@ -26,11 +27,26 @@ class ArpScanner : public ClientList {
     // Whether a scan thread is still at work.
     static bool IsScanning() { return scanning_; }
 
+    // A client as one line of "arp -a" names it.
+    struct ArpEntry {
+        std::string name;
+        std::string ip;
+        std::string mac;
+        std::string ifname;
+    };
+
     void UpdateArpTabe();
     int GetArpTable();
     // One line of "arp -a": "host (ip) at mac [ether] on ifname".
     int AppendClientList(const std::string& line);
+    // 1 for a client of a bridge (IPv4, colon MAC and interface name checked), 0 for a line of
+    // another interface, -1 (logged) for a bridge line with a bad address or interface.
+    static int ParseArpLine(const std::string& line, ArpEntry& entry);
     int GetDHCPInfoByMAC(const std::string& mac, std::string& name);
+    // The host name of the first lease line holding mac ("expiry mac ip name ..."); "" when that
+    // line names none. name is left alone when no line holds mac or mac is empty.
+    static void FindLeaseName(const std::vector<std::string>& leases, const std::string& mac,
+                              std::string& name);
     int GetNmbInfoByIP(const std::string& ip, std::string& name);
     static void* WaitProcessFinish(void*);
 

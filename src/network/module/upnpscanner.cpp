@@ -219,7 +219,11 @@ void UpnpScanner::HandleDiscovery(const std::string& ip, const std::string& loca
 }
 
 bool UpnpScanner::DescribeDevice(const std::string& description, Json::Value& device) {
-    if (description.size() > kMaxDescriptionLength) {
+    // ixml refuses text after the root element but leaks the node it made of it.
+    const std::size_t end = description.find_last_of('>');
+    if (description.size() > kMaxDescriptionLength ||
+        description.find_first_not_of(" \t\r\n", end == std::string::npos ? 0 : end + 1) !=
+            std::string::npos) {
         return false;
     }
     IXML_Document* parsed = nullptr;

@@ -44,6 +44,7 @@ TEST(UpnpScannerTest, DescriptionsGiveTheFirstOfEachNameCleanedAndBounded) {
     // ixml refuses what is not well-formed UTF-8 XML: nothing is described.
     for (const std::string& bad :
          {std::string("<root><device><friendlyName>x</device></root>"), std::string(),
+          std::string("<root/>x"),
           Document("<friendlyName>" + std::string(70000, 'x') + "</friendlyName>")}) {
         EXPECT_FALSE(UpnpScanner::DescribeDevice(bad, device)) << bad.substr(0, 40);
     }

@@ -5,6 +5,7 @@
 #include <cerrno>
 #include <cstring>
 #include <sstream>
+#include <utility>
 #include <vector>
 
 #include "platform/qlib_net.h"
@@ -40,7 +41,9 @@ std::string Word(const std::string& line, std::size_t position) {
 }
 
 bool IsStation(const std::string& mac) {
-    return WifiScanner::RegMatch(mac.c_str(), kStationPattern);
+    // regexec would stop at a NUL and pass whatever follows it.
+    return mac.find('\0') == std::string::npos &&
+           WifiScanner::RegMatch(mac.c_str(), kStationPattern);
 }
 
 int LogCommandFailure(const std::string& command) {
@@ -95,13 +98,21 @@ int WifiScanner::GetStationByIfName(const std::string& ifname) {
     if (vorn::platform::ReadShellCommandLines(command, lines, kMaxStationLines) != 0) {
         return LogCommandFailure(command);
     }
-    for (const std::string& line : lines) {
-        const std::string mac = Word(line, 0);
-        if (IsStation(mac)) {
-            AppendClientList(mac, ifname);
-        }
+    for (const std::string& mac : ParseStations(lines)) {
+        AppendClientList(mac, ifname);
     }
     return 0;
+}
+
+std::vector<std::string> WifiScanner::ParseStations(const std::vector<std::string>& lines) {
+    std::vector<std::string> stations;
+    for (const std::string& line : lines) {
+        std::string mac = Word(line, 0);
+        if (IsStation(mac)) {
+            stations.push_back(std::move(mac));
+        }
+    }
+    return stations;
 }
 
 int WifiScanner::AppendClientList(const std::string& mac, const std::string& ifname) {
@@ -135,6 +146,11 @@ int WifiScanner::GetIwDevInfo(Json::Value& obj) {
     if (vorn::platform::ReadShellCommandLines(command, lines) != 0) {
         return LogCommandFailure(command);
     }
+    ParseIwStation(lines, obj);
+    return 0;
+}
+
+void WifiScanner::ParseIwStation(const std::vector<std::string>& lines, Json::Value& obj) {
     for (const std::string& line : lines) {
         if (line.find("rx bytes") != std::string::npos) {
             obj["transferRX"] = Word(line, 2);
@@ -148,7 +164,6 @@ int WifiScanner::GetIwDevInfo(Json::Value& obj) {
             break;
         }
     }
-    return 0;
 }
 
 bool WifiScanner::RegMatch(const char* text, const char* pattern) {

@@ -2,6 +2,7 @@
 #define VORN_NETWORK_MODULE_WIFISCANNER_H
 
 #include <string>
+#include <vector>
 
 #include "network/module/clientlist.h"
 
@@ -26,6 +27,10 @@ class WifiScanner : public ClientList {
     // Adds "transferRX", "transferTX" and "signalstrength" to obj, which names the station by
     // "netif" and "macAddr".
     int GetIwDevInfo(Json::Value& obj);
+    // The stations of "hostapd_cli all_sta": the first words that match the station pattern.
+    static std::vector<std::string> ParseStations(const std::vector<std::string>& lines);
+    // The counters and signal of "iw dev IF station get MAC" into obj, as GetIwDevInfo adds them.
+    static void ParseIwStation(const std::vector<std::string>& lines, Json::Value& obj);
     // Whether text matches the extended regular expression pattern.
     static bool RegMatch(const char* text, const char* pattern);
     static int ConvertDbmToPercent(int dbm);

@@ -84,6 +84,8 @@ TEST_F(WifiScannerTest, IwIsAskedOnlyAboutValidStations) {
     EXPECT_THAT(root_.Calls(), IsEmpty());
     EXPECT_EQ(WifiScanner::ConvertDbmToPercent(-35), 100);
     EXPECT_EQ(WifiScanner::ConvertDbmToPercent(INT_MIN), 0);
+    // The pattern must see the whole word, not the text before a NUL.
+    EXPECT_THAT(WifiScanner::ParseStations({std::string("00:11:22:33:44:55\0;x", 20)}), IsEmpty());
 }
 
 }  // namespace

@@ -34,6 +34,8 @@ constexpr int kExecFlags = QLIBC_EXEC_WAIT | QLIBC_EXEC_NO_STDIN | QLIBC_EXEC_NO
 constexpr int kQuietFlags = kExecFlags | QLIBC_EXEC_NO_STDERR;
 // "20.0 dBm" is read as "20.": three characters and the end of the buffer.
 constexpr std::size_t kPowerBytes = 4;
+// Far above any radio's; what iw could not mean ("9e9") never reaches SetTXPower's int.
+constexpr double kMaxPowerDbm = 100;
 // 256 stations of about 30 lines each.
 constexpr std::size_t kMaxStationLines = 8192;
 constexpr std::size_t kStationLineBytes = 1024;
@@ -295,25 +297,7 @@ double ReadMaxPower(int channel) {
         VORN_LOG(LOG_ERR, "Failed to execute cmd [%s]", command.c_str());
         return 0;
     }
-    char* end = nullptr;
-    const double power = std::strtod(text.c_str(), &end);
-    return end != text.c_str() && std::isfinite(power) && power > 0 ? power : 0;
-}
-
-// The lines of "hostapd_cli all_sta": a MAC address line starts a station, its keys follow.
-std::vector<utils::ConnectionInfo> ParseStations(const std::vector<std::string>& lines) {
-    const std::string timeKey = "connected_time=";
-    std::vector<utils::ConnectionInfo> stations;
-    for (const std::string& line : lines) {
-        if (MacAddress::IsFormalized(line)) {
-            stations.emplace_back();
-            stations.back().mac = MacAddress(line);
-        } else if (!stations.empty() && line.compare(0, timeKey.size(), timeKey) == 0) {
-            vornwireless::utils::ParseDecimal(line.substr(timeKey.size()),
-                                              stations.back().connected_time);
-        }
-    }
-    return stations;
+    return AdapterAgentHostapd::ParseMaxPower(text);
 }
 
 }  // namespace
@@ -420,6 +404,28 @@ int AdapterAgentHostapd::LoadStationConnData(std::vector<utils::ConnectionInfo>&
     }
     AddConnections(ParseStations(lines), connections);
     return 0;
+}
+
+double AdapterAgentHostapd::ParseMaxPower(const std::string& text) {
+    char* end = nullptr;
+    const double power = std::strtod(text.c_str(), &end);
+    return end != text.c_str() && power > 0 && power <= kMaxPowerDbm ? power : 0;
+}
+
+std::vector<utils::ConnectionInfo> AdapterAgentHostapd::ParseStations(
+    const std::vector<std::string>& lines) {
+    const std::string timeKey = "connected_time=";
+    std::vector<utils::ConnectionInfo> stations;
+    for (const std::string& line : lines) {
+        if (MacAddress::IsFormalized(line)) {
+            stations.emplace_back();
+            stations.back().mac = MacAddress(line);
+        } else if (!stations.empty() && line.compare(0, timeKey.size(), timeKey) == 0) {
+            vornwireless::utils::ParseDecimal(line.substr(timeKey.size()),
+                                              stations.back().connected_time);
+        }
+    }
+    return stations;
 }
 
 int AdapterAgentHostapd::EnableWPSWithPBC() {

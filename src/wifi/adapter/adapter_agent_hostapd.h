@@ -38,6 +38,13 @@ class AdapterAgentHostapd : public AdapterAgentAP {
     // policy is unknown while rules are on, is refused (-1, logged) before any file changes.
     virtual int GenerateHostapdConfig(const AdapterConfig& config);
 
+    // The radio's maximum power in dBm from what the "iw phy0 info" pipeline prints ("20." of
+    // "20.0 dBm"); 0 when it shows none or more than 100 dBm.
+    static double ParseMaxPower(const std::string& text);
+    // The lines of "hostapd_cli all_sta": a MAC address line starts a station, its
+    // "connected_time=" line gives the station's connection time.
+    static std::vector<utils::ConnectionInfo> ParseStations(const std::vector<std::string>& lines);
+
   protected:
     explicit AdapterAgentHostapd(const std::string& name) : AdapterAgentAP(name) {}
 

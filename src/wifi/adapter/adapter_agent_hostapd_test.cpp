@@ -156,6 +156,8 @@ TEST_F(HostapdTest, TxPowerIsTheLevelsShareOfTheChannelsMaximum) {
     EXPECT_EQ(agent_.SetTXPower(config), -1);
     EXPECT_THAT(root_.Calls(), ElementsAre("/usr/sbin/iw phy0 info"));
     EXPECT_TRUE(log_.Contains("No maximum tx power for channel 12 of [wlan0]"));
+    // No radio's maximum: once overflowed the int of the txpower command.
+    EXPECT_EQ(AdapterAgentHostapd::ParseMaxPower("9e9"), 0);
 }
 
 TEST_F(HostapdTest, StationsFromHostileOutputWithAddressAndHostName) {

@@ -36,13 +36,18 @@ bool ReadSupplicantStatus(const std::string& ifname, std::map<std::string, std::
         VORN_LOG(LOG_ERR, "Failed to execute cmd [%s]", command.c_str());
         return false;
     }
+    ParseSupplicantStatus(lines, status);
+    return true;
+}
+
+void ParseSupplicantStatus(const std::vector<std::string>& lines,
+                           std::map<std::string, std::string>& status) {
     for (const std::string& line : lines) {
         std::string key, value;
         if (vorn::platform::ParseKeyLine(line, "=", false, key, value)) {
             status[key] = value;
         }
     }
-    return true;
 }
 
 int GetAdapterNum() {

@@ -22,6 +22,9 @@ int GetAdapterNum();
 // The "key=value" lines of "wpa_cli -i IF status" into status; false (logged) for a bad name
 // or a command that cannot run.
 bool ReadSupplicantStatus(const std::string& ifname, std::map<std::string, std::string>& status);
+// Those lines into status: a later key replaces an earlier one.
+void ParseSupplicantStatus(const std::vector<std::string>& lines,
+                           std::map<std::string, std::string>& status);
 
 // A known or scanned network in the JSON form of a configuration's "stations" entries, with the
 // scan's "signal".

@@ -3,6 +3,8 @@
 #include <net/if_arp.h>
 #include <strings.h>
 
+#include <algorithm>
+#include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
@@ -159,6 +161,12 @@ std::string BandLetters(const std::string& ifname) {
             "/usr/sbin/iw phy '" + phy + "' info | grep -E '^.Band [0-9]+:|HT20'", lines) != 0) {
         return "";
     }
+    return ParseBandLetters(lines);
+}
+
+}  // namespace
+
+std::string ParseBandLetters(const std::vector<std::string>& lines) {
     std::string letters;
     for (const auto& line : lines) {
         if (line.rfind("\tBand 1:", 0) == 0) {
@@ -172,8 +180,6 @@ std::string BandLetters(const std::string& ifname) {
     }
     return letters;
 }
-
-}  // namespace
 
 std::string GetPhyName(const std::string& ifname) {
     std::string phy;
@@ -358,16 +364,22 @@ int GetSignalStrength(const std::string& ifname) {
     if (vorn::platform::ReadShellCommandLine(command, line, kValueSize) != 0) {
         return -1;
     }
+    return ParseLinkQuality(line);
+}
+
+int ParseLinkQuality(const std::string& line) {
     const std::string::size_type at = line.find("Link Quality=");
     int quality = 0, scale = 0;
     if (at == std::string::npos) {
         return -1;
     }
     const int parsed = std::sscanf(line.c_str() + at, "Link Quality=%d/%d", &quality, &scale);
+    // A driver's figures are not trusted to stay within their scale.
     if (parsed == 2 && scale > 0) {
-        return quality * 100 / scale;
+        return static_cast<int>(
+            std::clamp<std::int64_t>(std::int64_t{quality} * 100 / scale, 0, 100));
     }
-    return parsed >= 1 ? quality : -1;
+    return parsed >= 1 ? std::clamp(quality, 0, 100) : -1;
 }
 
 int InsertRLTKernelModule(const std::string& module) {

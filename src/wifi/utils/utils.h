@@ -2,6 +2,7 @@
 #define VORN_WIFI_UTILS_UTILS_H
 
 #include <string>
+#include <vector>
 
 #include "utils/ip_address.h"
 #include "utils/mac_address.h"
@@ -40,6 +41,9 @@ std::string GetKiteBWlanMacAddress();
 // What the radio reports as its 802.11 modes (the seventh blank-separated word of iwconfig's
 // "IEEE 802.11" line, e.g. "802.11bgn"). 0, or -1 when the command cannot be started.
 int GetSupportedMode(const std::string& ifname, std::string& modes);
+// The letters of the 802.11 modes a radio's "iw phy PHY info" lines show: "bg" for band 1 (2.4
+// GHz), "a" for band 2 (5 GHz), "n" when HT20 rates are listed.
+std::string ParseBandLetters(const std::vector<std::string>& lines);
 // The wiphy of a mac80211 radio ("phy0"); "" for any other interface.
 std::string GetPhyName(const std::string& ifname);
 
@@ -79,6 +83,8 @@ bool IsSectionExist(const std::string& file, const std::string& section);
 // The link quality iwconfig reports for the interface, as a percentage when it reports "N/M";
 // -1 when there is none.
 int GetSignalStrength(const std::string& ifname);
+// The same from iwconfig's "Link Quality" line, within 0..100.
+int ParseLinkQuality(const std::string& line);
 
 // The RLT radio's driver: "/sbin/insmod" "/usr/vorn/lib/modules/MODULE" and "/sbin/rmmod" NAME
 // (MODULE without ".ko"). 0 or -1.
