@@ -3,13 +3,10 @@
 // parser. Whatever a parser accepts has the form its callers rely on.
 #include <arpa/inet.h>
 #include <json/json.h>
-#include <stdlib.h>
-#include <sys/stat.h>
 
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
-#include <filesystem>
 #include <fstream>
 #include <map>
 #include <sstream>
@@ -23,6 +20,7 @@
 #include "platform/root_path.h"
 #include "platform/text_file.h"
 #include "require.h"
+#include "scratch_world.h"
 #include "utils/interface_name.h"
 #include "utils/log.h"
 #include "utils/mac_address.h"
@@ -147,18 +145,10 @@ void CheckDescription(const std::string& text) {
     }
 }
 
-char root[] = "/tmp/vorn-output-fuzz-XXXXXX";
-
 }  // namespace
 
 extern "C" int LLVMFuzzerInitialize(int*, char***) {
-    if (mkdtemp(root) == nullptr) {
-        std::abort();
-    }
-    std::atexit([] { std::filesystem::remove_all(root); });
-    setenv("VORN_ROOT", root, 1);
-    mkdir(vorn::platform::RootPath("/tmp").c_str(), 0755);
-    vorn::log::SetSink([](int, const std::string&) {});
+    EnterScratchWorld({"/tmp"});
     return 0;
 }
 

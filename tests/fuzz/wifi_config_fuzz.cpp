@@ -2,14 +2,11 @@
 // becomes hostapd, RLT and station files whose every line is one line of the expected form: no
 // injected line or key, no NUL, and no ";" where the RLT driver would split a value.
 #include <json/json.h>
-#include <stdlib.h>
-#include <sys/stat.h>
 
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
-#include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <map>
@@ -20,6 +17,7 @@
 
 #include "platform/root_path.h"
 #include "require.h"
+#include "scratch_world.h"
 #include "utils/json_text.h"
 #include "utils/log.h"
 #include "wifi/adapter/adapter.h"
@@ -143,21 +141,11 @@ void CheckStations(const AdapterConfig& config) {
     }
 }
 
-char root[] = "/tmp/vorn-wifi-fuzz-XXXXXX";
-
 }  // namespace
 
 extern "C" int LLVMFuzzerInitialize(int*, char***) {
-    if (mkdtemp(root) == nullptr) {
-        std::abort();
-    }
-    std::atexit([] { std::filesystem::remove_all(root); });
-    setenv("VORN_ROOT", root, 1);
     // The folders above those the agents make.
-    for (const char* dir : {"/etc", "/usr", "/usr/vorn", "/usr/vorn/etc"}) {
-        mkdir(vorn::platform::RootPath(dir).c_str(), 0755);
-    }
-    vorn::log::SetSink([](int, const std::string&) {});
+    EnterScratchWorld({"/etc", "/usr/vorn/etc"});
     Adapter::SwitchTopology(WIFI_TOPOLOGY_ROUTER);
     return 0;
 }
