@@ -89,6 +89,26 @@ void SimRoot::Scenario(const std::string& program, const std::string& text) cons
     WriteFile(kScenarioDir + program, text);
 }
 
+std::map<std::string, std::string> SimRoot::Files() const {
+    std::map<std::string, std::string> files;
+    for (const auto& entry : std::filesystem::recursive_directory_iterator(dir_)) {
+        const std::string logical = entry.path().string().substr(dir_.size());
+        if (entry.is_regular_file() && !entry.is_symlink() && logical.rfind("/.vornsim", 0) != 0) {
+            files[logical] = ReadFile(logical);
+        }
+    }
+    return files;
+}
+
+void SimRoot::PrepareRadio() const {
+    WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth0",
+              "DEVICE=eth0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
+    Scenario("iwconfig", "when wlan0*\nprint wlan0     IEEE 802.11bgn  ESSID:off/any\n");
+    for (const char* bridge : {"lbr0", "br0"}) {
+        WriteFile(std::string("/proc/sys/net/ipv6/conf/") + bridge + "/disable_ipv6", "0\n");
+    }
+}
+
 std::vector<std::string> SimRoot::Calls() const {
     return Lines(ReadFile(kCallLog));
 }

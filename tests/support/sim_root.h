@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <json/json.h>
 
+#include <map>
 #include <string>
 #include <vector>
 
@@ -31,6 +32,12 @@ class SimRoot {
     // Writes a file (creating its directories); ReadFile gives "" for a missing file.
     void WriteFile(const std::string& logical, const std::string& content) const;
     std::string ReadFile(const std::string& logical) const;
+    // Every regular file by logical path with its content, the simulator's own records left out.
+    std::map<std::string, std::string> Files() const;
+    // What vornwifid needs to come up with the radio wlan0 in the router topology: what the
+    // radio reports, the kernel files the simulated brctl does not make, and an address br0 can
+    // take over from eth0.
+    void PrepareRadio() const;
 
     // Replaces the scenario of a simulated program (named by its base name, e.g. "ip"): rule
     // blocks "when GLOB" followed by "print LINE", "stderr LINE" and "exit N" lines; see

@@ -55,32 +55,12 @@ Json::Value Parsed(const Answer& answer) {
     return Parse(answer.text);
 }
 
-// Every regular file of the root with its content, the simulator's own records left out.
-std::map<std::string, std::string> Files(const SimRoot& root) {
-    std::map<std::string, std::string> files;
-    for (const auto& entry : std::filesystem::recursive_directory_iterator(root.Dir())) {
-        const std::string logical = entry.path().string().substr(root.Dir().size());
-        if (entry.is_regular_file() && !entry.is_symlink() && logical.rfind("/.vornsim", 0) != 0) {
-            files[logical] = root.ReadFile(logical);
-        }
-    }
-    return files;
-}
-
 class VornwifidTest : public ::testing::Test {
   protected:
     void SetUp() override {
         ASSERT_TRUE(bus_.Started());
         ASSERT_TRUE(netd_.WaitForBusName("com.tessarin.net", kStartTimeout)) << netd_.Stderr();
-        // What the radio reports, the kernel files the simulated brctl does not make, and an
-        // address br0 can take over from eth0.
-        root_.WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth0",
-                        "DEVICE=eth0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
-        root_.Scenario("iwconfig", "when wlan0*\nprint wlan0     IEEE 802.11bgn  ESSID:off/any\n");
-        for (const char* bridge : {"lbr0", "br0"}) {
-            root_.WriteFile(std::string("/proc/sys/net/ipv6/conf/") + bridge + "/disable_ipv6",
-                            "0\n");
-        }
+        root_.PrepareRadio();
     }
     void Start() {
         wifid_ =
@@ -183,7 +163,7 @@ TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
     ASSERT_NO_FATAL_FAILURE(Start());
     const Json::Value config = Parsed(Call("GetAdapterConfig", "wlan0"));
     const Json::Value bridge = Parsed(Call("GetBridgeConfig", "lbr0"));
-    const auto before = Files(root_);
+    const auto before = root_.Files();
 
     const std::map<std::string, std::string> unknownAdapter = {
         {"GetAdapterConfig", "Adapter is not found(wlan9)"},
@@ -243,7 +223,7 @@ TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
     }
     EXPECT_EQ(Call("ApplyAdapter", "wlan0", "{}").text, "Failed to get config(wlan0)");
     ExpectServing();
-    const auto after = Files(root_);
+    const auto after = root_.Files();
     for (const auto& [file, content] : after) {
         EXPECT_EQ(content, before.count(file) != 0 ? before.at(file) : "(none)") << file;
     }
