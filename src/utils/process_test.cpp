@@ -6,11 +6,10 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <chrono>
 #include <string>
-#include <thread>
 
 #include "support/sim_root.h"
+#include "support/waiting.h"
 
 namespace vornwireless {
 namespace utils {
@@ -33,21 +32,17 @@ TEST_F(ProcessTest, FindsALiveProgramByItsExactNameOnly) {
     const std::string longName = "vornprocesstest-" + std::to_string(getpid()) + "-long";
     const pid_t shortOne = SpawnAs(root_, shortName);
     const pid_t longOne = SpawnAs(root_, longName);
-    EXPECT_TRUE(IsProcessAlive(shortName));
+    // Under an emulator (qemu-user) the spawn returns before the program has taken its name.
+    EXPECT_TRUE(vorn::test::WaitFor([&] { return IsProcessAlive(shortName); }));
+    EXPECT_TRUE(vorn::test::WaitFor([&] { return IsProcessAlive(longName); }));
     EXPECT_FALSE(IsProcessAlive(shortName.substr(0, shortName.size() - 4)));
-    EXPECT_TRUE(IsProcessAlive(longName));
     // The kernel keeps 15 characters of a name: they alone do not make the longer name.
     EXPECT_FALSE(IsProcessAlive(longName.substr(0, 15)));
     EXPECT_FALSE(IsProcessAlive(longName + "x"));
 
     // Killed but not yet reaped (a zombie) is not alive.
     kill(shortOne, SIGKILL);
-    bool gone = false;
-    for (int i = 0; i < 200 && !gone; ++i) {
-        gone = !IsProcessAlive(shortName);
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    EXPECT_TRUE(gone);
+    EXPECT_TRUE(vorn::test::WaitFor([&] { return !IsProcessAlive(shortName); }));
     kill(longOne, SIGKILL);
     waitpid(shortOne, nullptr, 0);
     waitpid(longOne, nullptr, 0);
