@@ -1,6 +1,8 @@
 // An adapter configuration from outside (its JSON form) that GetConfig and the checks accept
 // becomes hostapd, RLT and station files whose every line is one line of the expected form: no
-// injected line or key, no NUL, and no ";" where the RLT driver would split a value.
+// injected line or key, no NUL, and no ";" where the RLT driver would split a value; the adapter's
+// saved files read back as the same configuration. A bridge configuration GetConfig accepts reads
+// back from its topology file section as written.
 #include <json/json.h>
 
 #include <algorithm>
@@ -10,6 +12,7 @@
 #include <fstream>
 #include <iterator>
 #include <map>
+#include <memory>
 #include <set>
 #include <sstream>
 #include <string>
@@ -25,12 +28,17 @@
 #include "wifi/adapter/adapter_agent_client_rlt.h"
 #include "wifi/adapter/adapter_agent_hostapd_router.h"
 #include "wifi/adapter/adapter_agent_rlt.h"
+#include "wifi/bridge/local_bridge.h"
 #include "wifi/settings/adapter_config_check.h"
+#include "wifi/settings/adapter_data.h"
 #include "wifi/utils/adapter_config_json.h"
+#include "wifi/utils/bridge_config_json.h"
 
 namespace {
 
 using namespace vornwireless::wifi;
+
+constexpr char kRouterTopologyFile[] = "/usr/vorn/etc/wifi/wifi_topology_router";
 
 std::set<std::string> Words(const std::string& text) {
     std::istringstream in(text);
@@ -141,11 +149,37 @@ void CheckStations(const AdapterConfig& config) {
     }
 }
 
+void CheckSaved(AdapterConfig config) {
+    using Data = std::unique_ptr<AdapterData, int (*)(AdapterData*)>;
+    const Data data(AdapterData::Create("wlan0"), AdapterData::Delete);
+    Require(data != nullptr);
+    // What the adapter itself tells, not its files.
+    config.bssid = data->GetConfig().bssid;
+    config.driver = data->GetConfig().driver;
+    data->SetConfig(config);
+    data->Write();
+    const Data back(AdapterData::Create("wlan0"), AdapterData::Delete);
+    Require(back != nullptr && back->GetConfig() == config);
+}
+
+void CheckBridge(const Json::Value& json) {
+    BridgeConfig config;
+    if (utils::GetConfig(json, config) != 0) {
+        return;
+    }
+    Require(LocalBridge("lbr0").SetTopologyFile(config) == 0);
+    BridgeConfig back;
+    Require(utils::GetConfig(std::string(kRouterTopologyFile), "lbr0", back) == 0 &&
+            back.ToFields() == config.ToFields());
+}
+
 }  // namespace
 
 extern "C" int LLVMFuzzerInitialize(int*, char***) {
     // The folders above those the agents make.
-    EnterScratchWorld({"/etc", "/usr/vorn/etc"});
+    EnterScratchWorld({"/etc", "/usr/vorn/etc/wifi", "/sys/class/net/wlan0"});
+    std::ofstream(vorn::platform::RootPath("/sys/class/net/wlan0/address"))
+        << "02:76:6f:72:6e:02\n";
     Adapter::SwitchTopology(WIFI_TOPOLOGY_ROUTER);
     return 0;
 }
@@ -156,6 +190,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
                                         json, 1 << 16)) {
         return 0;
     }
+    CheckBridge(json);
     AdapterConfig config;
     if (vornwireless::wifi::utils::GetConfig(json, config) != 0) {
         return 0;
@@ -164,5 +199,6 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     CheckHostapd(config);
     CheckRLT(config);
     CheckStations(config);
+    CheckSaved(config);
     return 0;
 }
