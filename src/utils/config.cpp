@@ -9,6 +9,8 @@
 
 #include "platform/qlibc_container.h"
 #include "platform/qlibc_file.h"
+#include "platform/root_path.h"
+#include "platform/text_file.h"
 #include "utils/file.h"
 #include "utils/log.h"
 #include "utils/temp_file.h"
@@ -224,34 +226,21 @@ int ConfigNoSection::Write() {
     if (MakeDirectory() != 0) {
         return -1;
     }
-    const char* file = GetNameCString();
-    HashHolder pairs;
-    HashHolder none;
-    if (pairs.hash == nullptr || none.hash == nullptr) {
-        VORN_LOG(LOG_ERR, "Failed to allocate memory");
-        return -1;
-    }
+    // The pairs alone, replacing the file whole: a writer killed half-way leaves the previous
+    // file, never a torn or missing one.
+    std::string text;
+    std::string line;
     for (const auto& pair : pairs_) {
-        QLIBCSzHashSetValue(pairs.hash, pair.first.c_str(), pair.second.c_str());
+        if (!vorn::platform::IsWritableKey(pair.first) ||
+            !vorn::platform::IsWritableValue(pair.second) ||
+            !vorn::platform::FormatPair("%s=%s\n", pair.first.c_str(), pair.second.c_str(), line)) {
+            VORN_LOG(LOG_ERR, "Failed to set keys");
+            return -1;
+        }
+        text += line;
     }
-    // The pairs go into a fresh empty file beside it, which then replaces the file whole: a
-    // writer killed half-way leaves the previous file, never a torn or missing one.
-    TempFile temp(GetNameString());
-    const bool created = temp.Created();
-    temp.Close();
-    if (!created) {
-        VORN_LOG(LOG_ERR, "Failed to touch [%s]", file);
-        return -1;
-    }
-    const char* tempName = temp.Logical().c_str();
-    if (QLIBCFileSetKeys(tempName, pairs.hash, none.hash, 0) < 0) {
-        VORN_LOG(LOG_ERR, "Failed to set keys");
-        QLIBCSysUnlink(tempName);
-        return -1;
-    }
-    if (QLIBCSysRename(tempName, file) != 0) {
-        VORN_LOG(LOG_ERR, "Failed to rename file from [%s] to [%s]", tempName, file);
-        QLIBCSysUnlink(tempName);
+    if (!vorn::platform::WriteFileAtomically(vorn::platform::RootPath(GetNameString()), text)) {
+        VORN_LOG(LOG_ERR, "Failed to write [%s]", GetNameCString());
         return -1;
     }
     return 0;
