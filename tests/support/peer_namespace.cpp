@@ -17,6 +17,13 @@ constexpr char kNoDad[] = "/proc/sys/net/ipv6/conf/default/accept_dad";
 }  // namespace
 
 void PeerNamespaceTest::SetUp() {
+    EnterNamespace();
+    if (!IsSkipped() && !HasFatalFailure()) {
+        SetUpPeers();
+    }
+}
+
+void PeerNamespaceTest::EnterNamespace() {
     VORN_ENTER_PRIVATE_NETWORK_NAMESPACE_OR_SKIP();
     // "ip netns" keeps its namespaces under /run: a private one leaves nothing on the host.
     ASSERT_EQ(mount("tmpfs", "/run", "tmpfs", 0, nullptr), 0);

@@ -17,10 +17,12 @@ namespace test {
 // Base fixture of system tests whose uplinks are veth pairs with their far ends in namespaces of
 // their own. The test runs in a private network namespace over a live root whose named routing
 // tables the real ip sees; neither side runs duplicate address detection, so addresses work at
-// once. A derived SetUp calls this one first and stops when it skipped or failed.
+// once. A derived fixture lays out its links in SetUpPeers, which runs only once the namespace is
+// ready.
 class PeerNamespaceTest : public ::testing::Test {
   protected:
-    void SetUp() override;
+    void SetUp() final;
+    virtual void SetUpPeers() {}
     // Stops the programs, then removes the namespaces; a derived TearDown calls it last.
     void TearDown() override;
 
@@ -39,6 +41,8 @@ class PeerNamespaceTest : public ::testing::Test {
     std::unique_ptr<SimRoot> root_;
 
   private:
+    void EnterNamespace();
+
     std::vector<std::string> peers_;
     std::vector<std::unique_ptr<DaemonProcess>> programs_;
 };

@@ -32,11 +32,7 @@ constexpr const char* kLeaseFile = "/etc/dhcpd/lbr0.leases";
 
 class BridgeSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
-    void SetUp() override {
-        PeerNamespaceTest::SetUp();
-        if (IsSkipped() || HasFatalFailure()) {
-            return;
-        }
+    void SetUpPeers() override {
         AddPeer("br-lan", "wlan0", 11, "c0", 21);
         AddPeer("br-guest", "gwlan0", 12, "g0", 22);
         AddPeer("br-wan", "eth0", 13, "e0", 23);

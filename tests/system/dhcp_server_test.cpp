@@ -62,11 +62,7 @@ std::vector<DHCPD_CONF> Services() {
 
 class DhcpServerSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
-    void SetUp() override {
-        PeerNamespaceTest::SetUp();
-        if (IsSkipped() || HasFatalFailure()) {
-            return;
-        }
+    void SetUpPeers() override {
         Ip("link add br0 index 11 address 02:00:00:00:77:01 type bridge");
         AddPeer("client", "v0", 12, "c0", 21);
         Ip("link set v0 master br0");

@@ -24,11 +24,7 @@ using vorn::test::WaitFor;
 
 class IPv6ModuleSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
-    void SetUp() override {
-        PeerNamespaceTest::SetUp();
-        if (IsSkipped() || HasFatalFailure()) {
-            return;
-        }
+    void SetUpPeers() override {
         // The kernel here takes no default route of its own from the advertisements.
         std::ofstream("/proc/sys/net/ipv6/conf/default/accept_ra") << "0\n";
         AddPeer("r", "h0", 11, "r0", 17);

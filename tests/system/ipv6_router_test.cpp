@@ -34,11 +34,7 @@ constexpr char kDhcpdConf[] =
 
 class Router6SystemTest : public PeerNamespaceTest {
   protected:
-    void SetUp() override {
-        PeerNamespaceTest::SetUp();
-        if (IsSkipped() || HasFatalFailure()) {
-            return;
-        }
+    void SetUpPeers() override {
         AddPeer("r6-isp", "wan0", 11, "isp0", 17);
         Ip("-n r6-isp addr add 2001:db8:ffff::1/64 dev isp0");
         dir_ = MakeTempDir("r6-");

@@ -20,10 +20,9 @@ using vorn::test::Parse;
 
 class RouteSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
-    void SetUp() override {
-        PeerNamespaceTest::SetUp();
+    void SetUpPeers() override {
         for (const std::string i : {"1", "2"}) {
-            if (IsSkipped() || HasFatalFailure()) {
+            if (HasFatalFailure()) {
                 return;
             }
             AddPeer("up" + i, "u" + i, 10 + std::stoi(i), "p" + i, 20 + std::stoi(i));

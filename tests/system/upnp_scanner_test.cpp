@@ -35,11 +35,7 @@ Json::Value ServerEntry(const Json::Value& list) {
 
 class UpnpScannerSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
-    void SetUp() override {
-        PeerNamespaceTest::SetUp();
-        if (IsSkipped() || HasFatalFailure()) {
-            return;
-        }
+    void SetUpPeers() override {
         if (!std::filesystem::exists("/usr/sbin/minidlnad")) {
             GTEST_SKIP() << "minidlna is not installed";
         }
