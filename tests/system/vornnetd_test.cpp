@@ -4,7 +4,6 @@
 #include <signal.h>
 
 #include <cstdio>
-#include <filesystem>
 #include <string>
 #include <vector>
 
@@ -29,7 +28,6 @@ using Timeout = DaemonProcess::Timeout;
 constexpr char kVornnetd[] = VORN_BINARY_DIR "/daemons/vornnetd";
 constexpr char kTool[] = VORN_BINARY_DIR "/tools/vornnetdtool";
 constexpr char kService[] = "com.tessarin.net";
-constexpr char kRouteConfig[] = "/etc/iproute2/config";
 constexpr Timeout kStartTimeout{30000};
 constexpr Timeout kCallTimeout{20000};
 constexpr Timeout kExitTimeout{20000};
@@ -78,17 +76,6 @@ Answer CallService(const char* method, GVariant* parameters) {
 
 Answer CallService(const char* method, const std::string& argument) {
     return CallService(method, g_variant_new("(s)", argument.c_str()));
-}
-
-// Every file below the route module's folder, with its content.
-std::string RouteFiles(const SimRoot& root) {
-    std::string files;
-    for (const auto& entry :
-         std::filesystem::recursive_directory_iterator(root.Path(kRouteConfig))) {
-        files += entry.path().string() + ":" +
-                 root.ReadFile(entry.path().string().substr(root.Dir().size())) + "\n";
-    }
-    return files;
 }
 
 // Names and signatures of introspected arguments.
@@ -167,8 +154,6 @@ TEST_F(VornnetdTest, ServesEveryMethodToTheClientTheToolAndIntrospection) {
     EXPECT_GT(out_.size(), 200000u);
 
     // Failures answer through the tool's exit status: 2 for a bad command, 1 for a refusal.
-    EXPECT_EQ(Tool({"--help"}), 0);
-    EXPECT_THAT(out_, HasSubstr("Usage: vornnetdtool"));
     EXPECT_EQ(Tool({"--frobnicate", "x"}), 2);
     EXPECT_THAT(err_, HasSubstr("unknown command"));
     EXPECT_EQ(Tool({"--add-gateway", "not json"}), 2);
@@ -201,26 +186,21 @@ TEST_F(VornnetdTest, ServesEveryMethodToTheClientTheToolAndIntrospection) {
 }
 
 TEST_F(VornnetdTest, BadInputGetsAnErrorAndChangesNothing) {
-    const std::string before = RouteFiles(root_);
-    const std::string huge = R"({"ifname":")" + std::string(3 << 20, 'x') + R"("})";
-    std::string deep = "1" + std::string(10000, '}');
-    for (int i = 0; i < 10000; ++i) {
-        deep.insert(0, R"({"a":)");
-    }
-
-    const std::vector<std::string> unparsable = {"not json", R"({"type":)", "",   "[1]", R"("x")",
-                                                 "7",        "null",        deep, huge};
-    for (const std::string& input : unparsable) {
+    ExpectServing();
+    const auto before = root_.Files();
+    // Deep nesting, huge texts and other types for every method: the abuse test. Here each
+    // unparsable argument gets the error its method answers.
+    for (const char* input : {"not json", R"({"type":)", "[1]", "null"}) {
         for (const Method& method : kMethods) {
             const Answer answer = CallService(method.name, input);
             const char* error = method.json ? "" : method.garbage;
-            EXPECT_EQ(answer.ok, error == nullptr) << method.name << " " << input.substr(0, 40);
+            EXPECT_EQ(answer.ok, error == nullptr) << method.name << " " << input;
             if (method.json) {
                 EXPECT_EQ(answer.text, std::string("Method invoked for ") + method.name +
                                            " returned FALSE but did not set error")
-                    << method.name << " " << input.substr(0, 40);
+                    << method.name << " " << input;
             } else if (error != nullptr) {
-                EXPECT_EQ(answer.text, error) << method.name << " " << input.substr(0, 40);
+                EXPECT_EQ(answer.text, error) << method.name << " " << input;
             }
         }
         ExpectServing();
@@ -249,7 +229,7 @@ TEST_F(VornnetdTest, BadInputGetsAnErrorAndChangesNothing) {
     EXPECT_EQ(CallService("NoSuchMethod", std::string("{}")).errorName,
               "org.freedesktop.DBus.Error.UnknownMethod");
     ExpectServing();
-    EXPECT_EQ(RouteFiles(root_), before);
+    EXPECT_EQ(root_.Files(), before);
 }
 
 TEST_F(VornnetdTest, OneDaemonPerRootAndBusAndSigtermStopsIt) {

@@ -3,7 +3,6 @@
 #include <gio/gio.h>
 #include <gmock/gmock.h>
 #include <signal.h>
-#include <algorithm>
 
 #include <filesystem>
 #include <map>
@@ -25,6 +24,7 @@ namespace {
 using ::testing::AllOf;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
+using ::testing::IsSupersetOf;
 using vornwireless::utils::CompactJson;
 using Timeout = DaemonProcess::Timeout;
 
@@ -165,29 +165,21 @@ TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
     const Json::Value bridge = Parsed(Call("GetBridgeConfig", "lbr0"));
     const auto before = root_.Files();
 
+    // One method of each way a handler finds its adapter or bridge; bad input to every method:
+    // the abuse test.
     const std::map<std::string, std::string> unknownAdapter = {
         {"GetAdapterConfig", "Adapter is not found(wlan9)"},
-        {"GetAdapterCapability", "Adapter is not found(wlan9)"},
-        {"GetAdapterStatus", "Adapter is not found(wlan9)"},
-        {"EnableAdapter", "Adapter is not found(wlan9)"},
-        {"DisableAdapter", "Adapter is not found(wlan9)"},
         {"ExecSchedule", "Adapter is not found(wlan9)"},
-        {"GetConnectionList", "Adapter is not found(wlan9)"},
-        {"GetConnectedAPInfo", "Failed to get adapter for interface(wlan9)"},
         {"ScanNetworks", "Failed to get adapter for interface(wlan9)"},
-        {"EnableWPSWithPBC", "Failed to get adapter for interface(wlan9)"},
         {"GetBridgeConfig", "Bridge is not found(wlan9)"},
         {"RemoveAdapter", "Failed to remove adapter(wlan9)"},
         {"AddAdapter", "Failed to add adapter(wlan9)"},
     };
     for (const auto& [method, error] : unknownAdapter) {
-        const Answer answer = Call(method.c_str(), "wlan9");
-        EXPECT_FALSE(answer.ok) << method;
-        EXPECT_EQ(answer.text, error) << method;
+        EXPECT_EQ(Call(method.c_str(), "wlan9").text, error) << method;
     }
     EXPECT_EQ(Call("ApplyAdapter", "wlan9", "{}").text, "Adapter is not found(wlan9)");
     EXPECT_EQ(Call("ApplyBridge", "wlan9", "{}").text, "Bridge is not found(wlan9)");
-    EXPECT_EQ(Call("SwitchAdapterTopology", "wlan9", "router").text, "Adapter is not found(wlan9)");
     EXPECT_EQ(Call("EnableWPSWithPinCode", "wlan9", "1234").text,
               "Failed to get adapter for interface(wlan9)");
     EXPECT_EQ(Call("SwitchTopology", "mesh\nrouter").text,
@@ -197,12 +189,8 @@ TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
     EXPECT_EQ(Call("EnableWPSWithPinCode", "wlan0", "12;reboot").text,
               "Failed to enable wps pin code (wlan0)(12;reboot)");
 
-    // Configurations that are not JSON, have the wrong types, nest too deep, or would break a
-    // line of the access point's file.
-    std::string deep = "1" + std::string(10000, '}');
-    for (int i = 0; i < 10000; ++i) {
-        deep.insert(0, R"({"a":)");
-    }
+    // Configurations that are not JSON, have the wrong types, or would break a line of the
+    // access point's file.
     Json::Value wrongTypes = config;
     wrongTypes["channel"] = "six";
     wrongTypes["enabled"] = "yes";
@@ -211,23 +199,18 @@ TEST_F(VornwifidTest, BadInputGetsItsErrorAndChangesNothing) {
     Json::Value badBridge = bridge;
     badBridge["dhcp_enabled"] = "yes";
     badBridge["slave_list"] = Json::Value(7);
-    const std::vector<std::string> adapterInputs = {"not json", deep, "[]", CompactJson(wrongTypes),
+    const std::vector<std::string> adapterInputs = {"not json", "{}", CompactJson(wrongTypes),
                                                     CompactJson(newline)};
     for (const std::string& input : adapterInputs) {
         EXPECT_EQ(Call("ApplyAdapter", "wlan0", input).text, "Failed to get config(wlan0)")
             << input.substr(0, 60);
     }
-    for (const std::string& input : {std::string("not json"), deep, CompactJson(badBridge)}) {
+    for (const std::string& input : {std::string("not json"), CompactJson(badBridge)}) {
         EXPECT_EQ(Call("ApplyBridge", "lbr0", input).text, "Failed to get config(lbr0)")
             << input.substr(0, 60);
     }
-    EXPECT_EQ(Call("ApplyAdapter", "wlan0", "{}").text, "Failed to get config(wlan0)");
     ExpectServing();
-    const auto after = root_.Files();
-    for (const auto& [file, content] : after) {
-        EXPECT_EQ(content, before.count(file) != 0 ? before.at(file) : "(none)") << file;
-    }
-    EXPECT_EQ(after.size(), before.size());
+    EXPECT_EQ(root_.Files(), before);
 }
 
 TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
@@ -259,9 +242,6 @@ TEST_F(VornwifidTest, StartsCleanCatchesUpTheScheduleAndStopsOnSigterm) {
     EXPECT_EQ(second.WaitForExit(kExitTimeout), 1);
     EXPECT_THAT(second.Stderr(), HasSubstr("another vornwifid is running"));
     EXPECT_EQ(root_.ReadFile("/var/run/vornwifid.pid"), std::to_string(wifid_->Pid()) + "\n");
-    std::string out;
-    EXPECT_EQ(RunProgram({kVornwifid, "--help"}, kExitTimeout, &out), 0);
-    EXPECT_THAT(out, AllOf(HasSubstr("Usage: vornwifid"), HasSubstr("--foreground")));
     ExpectServing();
 }
 
@@ -278,12 +258,9 @@ TEST_F(VornwifidTest, KiteBBuiltInRadioComesUpThroughItsDriverProfile) {
     EXPECT_TRUE(applied.ok) << applied.text << wifid_->Stderr();
     const std::string profile = root_.ReadFile("/usr/vorn/etc/rlt_wifi/rlt_wifi.conf");
     EXPECT_THAT(profile, AllOf(HasSubstr("\nSSID1=Kite\n"), HasSubstr("\nWirelessMode=9\n")));
-    const auto calls = root_.Calls();
-    for (const char* call : {"/sbin/rmmod rlt_wifi", "/sbin/ifconfig wlan0 up",
-                             "/sbin/iwpriv wlan0 set WscConfMode=7"}) {
-        EXPECT_NE(std::find(calls.begin(), calls.end(), call), calls.end())
-            << call << wifid_->Stderr();
-    }
+    EXPECT_THAT(root_.Calls(), IsSupersetOf({"/sbin/rmmod rlt_wifi", "/sbin/ifconfig wlan0 up",
+                                             "/sbin/iwpriv wlan0 set WscConfMode=7"}))
+        << wifid_->Stderr();
     EXPECT_EQ(Parsed(Call("GetAdapterStatus", "wlan0"))["status"], "Enabled");
 
     // The driver splits its values at ";": refused, and the profile stays.
