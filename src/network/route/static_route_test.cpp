@@ -64,19 +64,16 @@ TEST_F(StaticRouteTest, SetRulesInstallsEnabledRoutesAndStoresAllInOrder) {
 TEST_F(StaticRouteTest, BadRequestsChangeNeitherTableNorFile) {
     StaticRoute routes;
     root_.WriteFile(kRuleFile, "[route_0000]\n\tenable=no\n");
-    const char* const bad[] = {
-        "[]",
-        "{\"rules\":[{\"ip\":\"10.0.0.0\",\"mask\":\"255.0.0.0\",\"gateway\":\"10.0.0.1\"}]}",
-        "{\"rules\":[{\"ip\":\"10.0.0.0\",\"mask\":\"255.0.255.0\",\"gateway\":\"10.0.0.1\","
-        "\"ifname\":\"eth0\"}]}",
-        "{\"rules\":[{\"ip\":\"10.0.0.0\",\"mask\":\"255.0.0.0\",\"gateway\":\"10.0.0.1\","
-        "\"ifname\":\"eth0 `reboot`\"}]}",
-        "{\"rules\":[{\"ip\":\"10.0.0.0\",\"mask\":\"255.0.0.0\",\"gateway\":\"10.0.0.1\","
-        "\"ifname\":\"eth0\",\"enable\":\"yes\"}]}",
+    const auto rules = [](const std::string& mask, const std::string& more) {
+        return Parse(R"({"rules":[{"ip":"10.0.0.0","gateway":"10.0.0.1","mask":")" + mask + '"' +
+                     more + "}]}");
     };
-    for (const char* text : bad) {
-        EXPECT_EQ(routes.SetRules(IP_TYPE_V4, Parse(text)), -1) << text;
-    }
+    EXPECT_EQ(routes.SetRules(IP_TYPE_V4, Parse("[]")), -1);
+    EXPECT_EQ(routes.SetRules(IP_TYPE_V4, rules("255.0.0.0", "")), -1);
+    EXPECT_EQ(routes.SetRules(IP_TYPE_V4, rules("255.0.255.0", R"(,"ifname":"eth0")")), -1);
+    EXPECT_EQ(routes.SetRules(IP_TYPE_V4, rules("255.0.0.0", R"(,"ifname":"eth0 `reboot`")")), -1);
+    EXPECT_EQ(routes.SetRules(IP_TYPE_V4, rules("255.0.0.0", R"(,"ifname":"eth0","enable":"yes")")),
+              -1);
     EXPECT_EQ(routes.SetRules(IP_TYPE_V6, Parse("{\"rules\":[{\"ip\":\"2001:db8::\","
                                                 "\"prefix_length\":\"129\",\"gateway\":\"fe80::1\","
                                                 "\"ifname\":\"eth0\"}]}")),
