@@ -1,6 +1,7 @@
 // The bridges of the router and bridge topologies laid out with the real brctl and ip on veth
-// slaves; dnsmasq checks every DHCP file they write and serves a lease from lbr0's; the real
-// route module, behind the network service on a private bus, gets the bridges' gateway records.
+// slaves; dnsmasq checks every DHCP file they write (a lease served from such files is the DHCP
+// server test's); the real route module, behind the network service on a private bus, gets the
+// bridges' gateway records.
 #include <gmock/gmock.h>
 #include <sys/stat.h>
 
@@ -23,12 +24,9 @@ namespace {
 
 using ::testing::HasSubstr;
 using vorn::test::RunProgram;
-using vorn::test::WaitFor;
 using vornnetwork::network::module::MODULE_ROUTE;
 using vornnetwork::network::module::ModuleManager;
 using vornnetwork::network::module::RouteModule;
-
-constexpr const char* kLeaseFile = "/etc/dhcpd/lbr0.leases";
 
 class BridgeSystemTest : public vorn::test::PeerNamespaceTest {
   protected:
@@ -129,21 +127,6 @@ TEST_F(BridgeSystemTest, RouterAndBridgeTopologiesRunWithRealBridgesAndDnsmasq) 
           "/etc/dhcpd/dhcpd-gbr0-gbr00.conf", "/etc/dhcpd/dhcpd-gbr0-gbr0v60.conf"}) {
         EXPECT_THAT(DnsmasqTest(file), HasSubstr("syntax check OK")) << file;
     }
-
-    const vorn::test::DaemonProcess& dnsmasq = Start(
-        {"/usr/sbin/dnsmasq", "-k", "--log-facility=-", "--bind-interfaces", "--no-resolv",
-         "--dhcp-authoritative", "--conf-file=" + root_->Path("/etc/dhcpd/dhcpd-lbr0-lbr00.conf"),
-         "--dhcp-leasefile=" + root_->Path(kLeaseFile),
-         "--pid-file=" + root_->Path("/etc/dhcpd/lbr0.pid")});
-    std::string output;
-    EXPECT_EQ(RunProgram({"/sbin/ip", "netns", "exec", "br-lan", "/usr/bin/busybox", "udhcpc", "-f",
-                          "-q", "-n", "-i", "c0", "-s", "/bin/true"},
-                         std::chrono::seconds(30), &output, &output),
-              0)
-        << output;
-    EXPECT_TRUE(WaitFor([&] {
-        return root_->ReadFile(kLeaseFile).find(" 192.168.100.") != std::string::npos;
-    })) << dnsmasq.Stderr();
 
     // The whole switch to the bridge topology: the ports leave lbr0, br0 takes eth0 and its
     // address.
