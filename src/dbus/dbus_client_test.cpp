@@ -6,6 +6,7 @@
 #include <cstdlib>
 
 #include "support/log_capture.h"
+#include "support/waiting.h"
 
 namespace vornwireless::dbus {
 namespace {
@@ -24,24 +25,10 @@ TEST(DBusClientTest, ErrorNumberIsTheFirstRunOfDigitsOrOne) {
 // process while anyone holds it, so this holds only while no other test keeps a client alive.
 class DeadBusTest : public ::testing::Test {
   protected:
-    DeadBusTest() {
-        const char* saved = std::getenv(kVariable);
-        hadAddress_ = saved != nullptr;
-        savedAddress_ = hadAddress_ ? saved : "";
-        setenv(kVariable, "unix:path=/nonexistent/vorn-test/bus", 1);
-    }
-    ~DeadBusTest() override {
-        if (hadAddress_) {
-            setenv(kVariable, savedAddress_.c_str(), 1);
-        } else {
-            unsetenv(kVariable);
-        }
-    }
+    DeadBusTest() { setenv("DBUS_SESSION_BUS_ADDRESS", "unix:path=/nonexistent/vorn-test/bus", 1); }
 
-    static constexpr const char* kVariable = "DBUS_SESSION_BUS_ADDRESS";
+    vorn::test::SavedVariable address_{"DBUS_SESSION_BUS_ADDRESS"};
     vorn::test::LogCapture log_;
-    std::string savedAddress_;
-    bool hadAddress_ = false;
 };
 
 TEST_F(DeadBusTest, UnreachableBusFailsEveryCallAndMisuseIsRefused) {
