@@ -11,6 +11,7 @@ lib=/usr/lib/$(dpkg-architecture -qDEB_HOST_MULTIARCH)
 for file in /lib/systemd/system/{vorn-bus,vornnetd,vornwifid}.service \
     /usr/share/dbus-1/services/com.tessarin.{net,wifi}.service /etc/rc.network \
     /usr/sbin/{vornnetd,vornwifid,vornnetdtool} /usr/bin/vornwireless \
+    /usr/libexec/vornnetwork/{iwlist,stop} \
     "$lib/libvornnetwork.so.5.0.0" "$lib/pkgconfig/vornnetwork.pc" \
     /usr/include/vornnetwork/dbus/net_client.h; do
     [ -e "$root$file" ] || { echo "check-packages: no $file" >&2; exit 1; }

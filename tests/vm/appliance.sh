@@ -102,7 +102,10 @@ start_appliance() {
         cp /usr/vorn/etc.defaults/wifi/wifi_topology_router_kite /usr/vorn/etc/wifi/wifi_topology_router
     fi
     mkdir -p /usr/vorn/sbin /usr/vorn/bin /lib/udev/script /usr/vorn/etc/rc.d /run/vorn
+    # The platform's iwlist takes wireless-tools' place, which it hands what it does not answer.
+    mv /sbin/iwlist /sbin/iwlist.distrib
     for link in "$source/src/platform/rc.network:/etc/rc.network" /usr/sbin/brctl:/usr/vorn/sbin/brctl \
+        "$source/src/platform/iwlist:/sbin/iwlist" "$source/src/platform/stop:/sbin/stop" \
         /usr/sbin/hostapd_cli:/usr/bin/hostapd_cli /usr/sbin/ethtool:/usr/vorn/bin/ethtool \
         "$build/tools/vornnetdtool:/usr/vorn/sbin/vornnetdtool" \
         "$build/tools/vornwireless:/usr/vorn/bin/vornwireless"; do
@@ -121,6 +124,18 @@ start_appliance() {
     waitfor 150 "$build/tools/vornnetdtool" --ready || fail "vornnetd did not come up"
     start_vornwifid
     PATH=$build/tools:$PATH
+}
+
+# call METHOD STRING...: a method of vornwifid through gdbus, which waits 300 s: under emulation a
+# switch or a join takes about as long as the clients' default wait of 25 s.
+call() {
+    python3 - "$@" <<'PY'
+import subprocess, sys
+strings = ["'" + a.replace("\\", "\\\\").replace("'", "\\'") + "'" for a in sys.argv[2:]]
+sys.exit(subprocess.call(["gdbus", "call", "--session", "--timeout", "300", "--dest",
+                          "com.tessarin.wifi", "--object-path", "/", "--method",
+                          "com.tessarin.wifi." + sys.argv[1]] + strings))
+PY
 }
 
 # Starts vornwifid (its pid in $vornwifid) and waits until it answers.

@@ -23,12 +23,8 @@ in_topology() {
     waitfor 400 associated || fail "the station did not come back in $1"
 }
 
-# A switch under emulation takes about as long as the clients' default wait of 25 s; gdbus is given
-# longer. The guarded switches below go through vornwireless and its default.
-switch_to() {
-    gdbus call --session --timeout 300 --dest com.tessarin.wifi --object-path / \
-        --method com.tessarin.wifi.SwitchTopology "$1" >/dev/null || fail "SwitchTopology $1 refused"
-}
+# The guarded switches below go through vornwireless and its default wait.
+switch_to() { call SwitchTopology "$1" >/dev/null || fail "SwitchTopology $1 refused"; }
 
 start=$(now)
 switch_to bridge
