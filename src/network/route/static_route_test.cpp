@@ -10,7 +10,6 @@
 namespace vornnetwork::network {
 namespace {
 
-using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
 const char kRuleFile[] = "/etc/iproute2/config/static-table-rule";
@@ -89,25 +88,6 @@ TEST_F(StaticRouteTest, BadRequestsChangeNeitherTableNorFile) {
     EXPECT_TRUE(
         log_.Contains("Failed to execute command[/sbin/ip -4 route flush table static-table]"));
     EXPECT_EQ(root_.ReadFile(kRuleFile), "[route_0000]\n\tenable=no\n");
-}
-
-// IPv4 against the kernel is the system test's.
-TEST_F(StaticRouteTest, TrialInstallNormalisesTheNetworkAndLeavesNoTrace) {
-    StaticRouteRule rule;
-    ASSERT_EQ(
-        StaticRoute::RuleFromJson(IP_TYPE_V6,
-                                  Parse("{\"ip\":\"2001:db8:1:2::5\",\"prefix_length\":\"48\","
-                                        "\"gateway\":\"fe80::1\",\"ifname\":\"eth0\"}"),
-                                  rule),
-        0);
-    Json::Value answer;
-    ASSERT_EQ(StaticRoute().TestRuleVaild(rule, answer), 0);
-    EXPECT_EQ(answer["ip"], "2001:db8:1::");
-    EXPECT_THAT(root_.Calls(),
-                ElementsAre("/sbin/ip -6 route add to 2001:db8:1::/48 via fe80::1 dev eth0 table "
-                            "static-table",
-                            "/sbin/ip -6 route del to 2001:db8:1::/48 via fe80::1 dev eth0 table "
-                            "static-table"));
 }
 
 TEST_F(StaticRouteTest, TableInfoReadsDestinationGatewayDeviceAndMetric) {
