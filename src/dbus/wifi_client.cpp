@@ -21,7 +21,7 @@ bool WifiClient::IsServerReady() const {
     return utils::IsProcessAlive("vornwifid") && DBusClient::IsServerReady();
 }
 
-int WifiClient::Call(const char* method, Arguments arguments, std::string* reply) {
+int WifiClient::Call(const char* method, Arguments arguments, std::string* reply, int timeoutMs) {
     int result = NewMessage(method);
     for (const std::string& argument : arguments) {
         if (result == 0) {
@@ -29,7 +29,7 @@ int WifiClient::Call(const char* method, Arguments arguments, std::string* reply
         }
     }
     if (result == 0) {
-        result = SendMessage(true, -1);
+        result = SendMessage(true, timeoutMs);
     }
     // The digits of an interface name can read as 0: an error reply is a failure all the same.
     if (result == 0 && !HasReply()) {
@@ -113,6 +113,10 @@ int WifiClient::ExecSchedule(const std::string& ifname) {
 
 int WifiClient::SwitchTopology(const std::string& topology) {
     return Call("SwitchTopology", {topology}, nullptr);
+}
+
+int WifiClient::SwitchTopology(const std::string& topology, int timeoutMs) {
+    return Call("SwitchTopology", {topology}, nullptr, timeoutMs);
 }
 
 int WifiClient::SwitchAdapterTopology(const std::string& ifname, const std::string& topology) {

@@ -37,6 +37,8 @@ class WifiClient : public DBusClient {
     int DisableAdapter(const std::string& ifname);
     int ExecSchedule(const std::string& ifname);
     int SwitchTopology(const std::string& topology);
+    // The same with a wait of its own (ms): on a slow radio a switch can outlast the usual 25 s.
+    int SwitchTopology(const std::string& topology, int timeoutMs);
     int SwitchAdapterTopology(const std::string& ifname, const std::string& topology);
     int AddAdapter(const std::string& ifname);
     int RemoveAdapter(const std::string& ifname);
@@ -51,7 +53,7 @@ class WifiClient : public DBusClient {
   private:
     using Arguments = std::initializer_list<std::string>;
     // One call; the reply text goes to reply when it is not null.
-    int Call(const char* method, Arguments arguments, std::string* reply);
+    int Call(const char* method, Arguments arguments, std::string* reply, int timeoutMs = -1);
     // parseFailure takes the reply text.
     int CallForJson(const char* method, Arguments arguments, Json::Value& value,
                     const char* parseFailure);

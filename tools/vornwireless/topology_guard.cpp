@@ -21,6 +21,9 @@ namespace {
 // Present while a switch waits; confirming removes it.
 constexpr const char* kGuardFile = "/tmp/vornwireless.topology-guard";
 constexpr std::chrono::milliseconds kPoll{200};
+// A switch given up on half-way would leave the appliance switched without its way back, so the
+// guard waits for it far longer than the clients' usual 25 s.
+constexpr int kSwitchWaitMs = 300000;
 
 }  // namespace
 
@@ -53,7 +56,7 @@ int GuardedSwitch(const std::string& topology, int seconds) {
     std::signal(SIGPIPE, SIG_IGN);
 
     vornwireless::dbus::WifiClient client;
-    const int switched = client.SwitchTopology(topology);
+    const int switched = client.SwitchTopology(topology, kSwitchWaitMs);
     if (switched != 0) {
         unlink(guard.c_str());
         return FinishCall("vornwireless", "--switch-topology", switched, nullptr, false);
@@ -70,7 +73,7 @@ int GuardedSwitch(const std::string& topology, int seconds) {
         std::this_thread::sleep_for(kPoll);
     }
     unlink(guard.c_str());
-    const int back = client.SwitchTopology(before);
+    const int back = client.SwitchTopology(before, kSwitchWaitMs);
     std::fprintf(stderr, "vornwireless: no confirmation within %d s: %s back to %s\n", seconds,
                  back == 0 ? "switched" : "failed to switch", before.c_str());
     return back == 0 ? 1 : ExitStatus(back);

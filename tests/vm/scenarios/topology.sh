@@ -23,7 +23,7 @@ in_topology() {
     waitfor 400 associated || fail "the station did not come back in $1"
 }
 
-# The guarded switches below go through vornwireless and its default wait.
+# The guarded switches below go through vornwireless, whose guard waits as long as gdbus here.
 switch_to() { call SwitchTopology "$1" >/dev/null || fail "SwitchTopology $1 refused"; }
 
 start=$(now)
