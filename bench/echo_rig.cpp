@@ -108,5 +108,26 @@ void SetMemoryCounters(benchmark::State& state, const std::string& process, cons
     state.counters[process + "_PrivateDirty"] = bytes(memory.privateDirtyKb);
 }
 
+Memory JsonEchoMemory() {
+    test::DaemonProcess jsonEcho{{VORN_JSON_ECHO_SERVICE}};
+    if (!jsonEcho.WaitForBusName(kJsonEchoService, test::DaemonProcess::Timeout{30000})) {
+        std::fprintf(stderr, "cannot start the JSON echo:\n%s", jsonEcho.Stderr().c_str());
+        return Memory{};
+    }
+    return ReadMemory(jsonEcho.Pid());
+}
+
+void SetMemoryComparison(benchmark::State& state, const std::string& process, const Memory& daemon,
+                         const Memory& echo, const Memory& jsonEcho) {
+    SetMemoryCounters(state, process, daemon);
+    SetMemoryCounters(state, "echo", echo);
+    SetMemoryCounters(state, "json_echo", jsonEcho);
+    const auto ratio = [&daemon](const Memory& baseline) {
+        return static_cast<double>(daemon.privateKb) / static_cast<double>(baseline.privateKb);
+    };
+    state.counters[process + "_vs_echo_private"] = ratio(echo);
+    state.counters[process + "_vs_json_echo_private"] = ratio(jsonEcho);
+}
+
 }  // namespace bench
 }  // namespace vorn

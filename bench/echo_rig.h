@@ -17,6 +17,7 @@ namespace bench {
 
 constexpr char kNetService[] = "com.tessarin.net";
 constexpr char kEchoService[] = "com.tessarin.bench.echo";
+constexpr char kJsonEchoService[] = "com.tessarin.bench.jsonecho";
 
 // vornnetd on a fresh simulated root and the minimal echo service (the baseline), on one private
 // bus, with this process's connection; members go in reverse order, the connection before the bus.
@@ -54,6 +55,13 @@ struct Memory {
 Memory ReadMemory(pid_t pid);
 // The counters PROCESS_Rss, _Pss, _Private and _PrivateDirty, in bytes.
 void SetMemoryCounters(benchmark::State& state, const std::string& process, const Memory& memory);
+// Starts the JSON echo on the current bus and reads its memory once it owns its name; it stops
+// again before this returns. Rss -1 when it did not start.
+Memory JsonEchoMemory();
+// The counters of SetMemoryCounters for the daemon and both echo services, and the daemon's
+// private memory as a ratio to each echo's: PROCESS_vs_echo_private, PROCESS_vs_json_echo_private.
+void SetMemoryComparison(benchmark::State& state, const std::string& process, const Memory& daemon,
+                         const Memory& echo, const Memory& jsonEcho);
 
 }  // namespace bench
 }  // namespace vorn

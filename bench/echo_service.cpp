@@ -1,23 +1,52 @@
-// The baseline of the D-Bus benchmarks: "com.tessarin.bench.echo" at "/" on the session bus, with
-// one method Echo(s) -> (s) that answers its argument, served by plain GDBus. Stops on SIGTERM.
+// The baseline of the D-Bus benchmarks: the service VORN_ECHO_NAME at "/" on the session bus, with
+// one method Echo(s) -> (s), served by plain GDBus. Stops on SIGTERM.
+//
+// Built twice: the plain echo answers its argument; with VORN_ECHO_JSON it reads the argument as
+// JSON and writes it back with jsoncpp, the least a daemon of the appliance does, so that its
+// memory shows what the C++ runtime and jsoncpp alone cost.
 #include <gio/gio.h>
 #include <glib-unix.h>
 #include <signal.h>
 
 #include <cstdio>
 
+#ifdef VORN_ECHO_JSON
+#include <json/json.h>
+
+#include <sstream>
+#include <string>
+#endif
+
 namespace {
 
-constexpr char kName[] = "com.tessarin.bench.echo";
+constexpr char kName[] = VORN_ECHO_NAME;
 constexpr char kIntrospection[] =
-    "<node><interface name='com.tessarin.bench.echo'><method name='Echo'>"
+    "<node><interface name='" VORN_ECHO_NAME
+    "'>"
+    "<method name='Echo'>"
     "<arg name='text' type='s' direction='in'/><arg name='text' type='s' direction='out'/>"
     "</method></interface></node>";
+
+#ifdef VORN_ECHO_JSON
+std::string JsonEcho(const char* text) {
+    Json::Value value;
+    std::istringstream in(text);
+    std::string errors;
+    if (!Json::parseFromStream(Json::CharReaderBuilder(), in, &value, &errors)) {
+        return errors;
+    }
+    return Json::writeString(Json::StreamWriterBuilder(), value);
+}
+#endif
 
 void OnMethodCall(GDBusConnection*, const gchar*, const gchar*, const gchar*, const gchar*,
                   GVariant* parameters, GDBusMethodInvocation* invocation, gpointer) {
     const gchar* text = nullptr;
     g_variant_get(parameters, "(&s)", &text);
+#ifdef VORN_ECHO_JSON
+    const std::string answer = JsonEcho(text);
+    text = answer.c_str();
+#endif
     g_dbus_method_invocation_return_value(invocation, g_variant_new("(s)", text));
 }
 

@@ -20,6 +20,7 @@ using vorn::bench::kEchoService;
 using vorn::bench::kNetService;
 using vorn::bench::Memory;
 using vorn::bench::ReadMemory;
+using vorn::bench::SetMemoryComparison;
 using vorn::bench::SetMemoryCounters;
 
 EchoRig* rig = nullptr;
@@ -27,6 +28,7 @@ EchoRig* rig = nullptr;
 Memory busMemory;
 Memory vornnetdMemory;
 Memory echoMemory;
+Memory jsonEchoMemory;
 
 std::string Call(const char* service, const char* method) {
     return vorn::bench::CallText(*rig, service, method, kRequest);
@@ -61,8 +63,7 @@ BENCHMARK(BM_SequentialRoundTrips)->Unit(benchmark::kMicrosecond);
 void BM_MemoryAfterStart(benchmark::State& state) {
     for (auto _ : state) {
     }
-    SetMemoryCounters(state, "vornnetd", vornnetdMemory);
-    SetMemoryCounters(state, "echo", echoMemory);
+    SetMemoryComparison(state, "vornnetd", vornnetdMemory, echoMemory, jsonEchoMemory);
     SetMemoryCounters(state, "dbus_daemon", busMemory);
 }
 BENCHMARK(BM_MemoryAfterStart)->Iterations(1);
@@ -74,5 +75,6 @@ int main(int argc, char** argv) {
         busMemory = ReadMemory(started.bus.Pid());
         vornnetdMemory = ReadMemory(started.vornnetd.Pid());
         echoMemory = ReadMemory(started.echo.Pid());
+        jsonEchoMemory = vorn::bench::JsonEchoMemory();
     });
 }

@@ -24,6 +24,7 @@ EchoRig* rig = nullptr;
 std::unique_ptr<vorn::test::DaemonProcess> vornwifid;
 Memory vornwifidMemory;
 Memory echoMemory;
+Memory jsonEchoMemory;
 
 void BM_SequentialRoundTrips(benchmark::State& state) {
     using Clock = std::chrono::steady_clock;
@@ -56,10 +57,8 @@ BENCHMARK(BM_SequentialRoundTrips)->Unit(benchmark::kMicrosecond);
 void BM_MemoryAfterStart(benchmark::State& state) {
     for (auto _ : state) {
     }
-    vorn::bench::SetMemoryCounters(state, "vornwifid", vornwifidMemory);
-    vorn::bench::SetMemoryCounters(state, "echo", echoMemory);
-    state.counters["vornwifid_vs_echo_private"] =
-        static_cast<double>(vornwifidMemory.privateKb) / static_cast<double>(echoMemory.privateKb);
+    vorn::bench::SetMemoryComparison(state, "vornwifid", vornwifidMemory, echoMemory,
+                                     jsonEchoMemory);
 }
 BENCHMARK(BM_MemoryAfterStart)->Iterations(1);
 
@@ -76,6 +75,7 @@ int main(int argc, char** argv) {
         }
         vornwifidMemory = vorn::bench::ReadMemory(vornwifid->Pid());
         echoMemory = vorn::bench::ReadMemory(started.echo.Pid());
+        jsonEchoMemory = vorn::bench::JsonEchoMemory();
     });
     vornwifid.reset();
     return status;
