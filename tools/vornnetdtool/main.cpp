@@ -404,14 +404,14 @@ constexpr const char* kDescription =
     "number (1 when it has none), 2 for a usage error. Give one command.";
 
 constexpr const char* kFooter =
-    "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n"
+    "A gateway type is v4 (\"GTYPE_V4\"), v6 (\"GTYPE_V6\") or all (\"ALL\").\n\n"
     "Example: vornnetdtool --add-gateway "
-    "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n"
+    "'{\"type\":\"GTYPE_V4\",\"ifname\":\"eth0\",\"priority\":0,\"gateway\":\"10.0.0.1\"}'\n\n"
     "A policy rule: {\"ifname\":\"eth0\",\"name\":\"lan\",\"ip\":\"10.1.0.0\","
     "\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\"}\n"
-    "  (IPv6: \"prefix_length\":\"64\" for \"mask\"; no \"ip\": the table's default route).\n"
+    "  (IPv6: \"prefix_length\":\"64\" for \"mask\"; no \"ip\": the table's default route).\n\n"
     "A static route: {\"ip\":\"10.1.0.0\",\"mask\":\"255.255.0.0\",\"gateway\":\"10.0.0.1\","
-    "\"ifname\":\"eth0\",\"enable\":true}.\n"
+    "\"ifname\":\"eth0\",\"enable\":true}.\n\n"
     "An IPv6 router: {\"type\":\"native\",\"wan\":\"eth0\",\"is_default_gateway\":true};\n"
     "  6in4 adds \"prefix\":\"2001:db8:1::/48\",\"remote_addr_v4\":\"198.51.100.1\",\n"
     "  \"local_addr_v6\":\"2001:db8::2/64\"; 6to4 needs only the wan; wan \"pppoe\" is the\n"
