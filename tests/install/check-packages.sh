@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Unpacks the built packages into a scratch root and checks that the units, the D-Bus files, the
-# library's links and the pkg-config file are where they belong. Usage: check-packages.sh DEB...
+# library's links, the pkg-config file and the manual pages are where they belong.
+# Usage: check-packages.sh DEB...
 set -euo pipefail
 root=$(mktemp -d)
 trap 'rm -rf "$root"' EXIT
@@ -13,7 +14,8 @@ for file in /lib/systemd/system/{vorn-bus,vornnetd,vornwifid}.service \
     /usr/sbin/{vornnetd,vornwifid,vornnetdtool} /usr/bin/vornwireless \
     /usr/libexec/vornnetwork/{iwlist,stop} \
     "$lib/libvornnetwork.so.5.0.0" "$lib/pkgconfig/vornnetwork.pc" \
-    /usr/include/vornnetwork/dbus/net_client.h; do
+    /usr/include/vornnetwork/dbus/net_client.h \
+    /usr/share/man/man8/{vornnetd,vornwifid,vornnetdtool}.8.gz /usr/share/man/man1/vornwireless.1.gz; do
     [ -e "$root$file" ] || { echo "check-packages: no $file" >&2; exit 1; }
 done
 [ "$(readlink "$root$lib/libvornnetwork.so.5")" = libvornnetwork.so.5.0.0 ]
