@@ -111,10 +111,6 @@ int WifiClient::ExecSchedule(const std::string& ifname) {
     return Call("ExecSchedule", {ifname}, nullptr);
 }
 
-int WifiClient::SwitchTopology(const std::string& topology) {
-    return Call("SwitchTopology", {topology}, nullptr);
-}
-
 int WifiClient::SwitchTopology(const std::string& topology, int timeoutMs) {
     return Call("SwitchTopology", {topology}, nullptr, timeoutMs);
 }

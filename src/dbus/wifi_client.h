@@ -36,9 +36,8 @@ class WifiClient : public DBusClient {
     int EnableAdapter(const std::string& ifname);
     int DisableAdapter(const std::string& ifname);
     int ExecSchedule(const std::string& ifname);
-    int SwitchTopology(const std::string& topology);
-    // The same with a wait of its own (ms): on a slow radio a switch can outlast the usual 25 s.
-    int SwitchTopology(const std::string& topology, int timeoutMs);
+    // timeoutMs -1 is the usual 25 s wait; on a slow radio a switch can outlast it.
+    int SwitchTopology(const std::string& topology, int timeoutMs = -1);
     int SwitchAdapterTopology(const std::string& ifname, const std::string& topology);
     int AddAdapter(const std::string& ifname);
     int RemoveAdapter(const std::string& ifname);
